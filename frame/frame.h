@@ -1,0 +1,106 @@
+// The calling frame shared by the effects: visit order, copy-then-edit, whole-image or masked
+// mode, the mask-equals-1 test and the guards that keep every access inside the caller's
+// buffers. An effect supplies only its per-pixel rule, a callable uint32_t(uint32_t) that maps
+// a source pixel to its result (keeping alpha is the rule's business; pfx::pack does it).
+//
+// The frames return false when they refuse the call (a buffer the call needs is null, or the
+// image is too large to address); nothing has been written then. Effects that return a result
+// code turn that into PHOTOFX_INVALID_ARGUMENT.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+#include "photofx.h"
+
+namespace pfx {
+
+// Largest image the library addresses: its byte size must fit the 32-bit counts of the memory
+// wrappers and its pixel indices a signed 32-bit integer, on every target.
+constexpr int64_t kMaxPixels = INT32_MAX / 4;
+
+// Pixel count of a width x height image; 0 when either side is zero or negative, since such an
+// image has no pixels to visit.
+constexpr int64_t pixel_count(int32_t width, int32_t height) {
+  return (width <= 0 || height <= 0) ? 0 : static_cast<int64_t>(width) * height;
+}
+
+// Region bounds, inclusive on both ends.
+struct Rect {
+  int32_t left, right, top, bottom;
+};
+
+// Valid bounds select masked mode; bounds with left > right or top > bottom mean whole image.
+constexpr bool is_region(const Rect& r) { return r.left <= r.right && r.top <= r.bottom; }
+
+// The part of `r` that lies inside a width x height image. May come out empty (left > right or
+// top > bottom): a rectangle entirely off the image selects nothing, it does not turn into
+// whole-image mode, so decide the mode before clipping.
+constexpr Rect clip_to_image(Rect r, int32_t width, int32_t height) {
+  if (r.left < 0) r.left = 0;
+  if (r.top < 0) r.top = 0;
+  if (r.right > width - 1) r.right = width - 1;
+  if (r.bottom > height - 1) r.bottom = height - 1;
+  return r;
+}
+
+// Copies a whole image of n pixels, unless source and destination are the same buffer (a
+// partial variant called in place then gives the same result as with two buffers).
+inline void copy_image(const uint32_t* src, uint32_t* dst, int64_t n) {
+  if (src != dst) fx_memcpy(dst, src, static_cast<uint32_t>(n * 4));
+}
+
+// Full variant: dst[i] = rule(src[i]) for every pixel in row order. Each output reads only its
+// own source pixel, so src and dst may be the same buffer.
+template <class Rule>
+inline bool for_each_pixel(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                           Rule&& rule) {
+  if (src == nullptr || dst == nullptr) return false;
+  const int64_t n = pixel_count(width, height);
+  if (n > kMaxPixels) return false;
+  for (size_t i = 0; i < static_cast<size_t>(n); ++i) dst[i] = rule(src[i]);
+  return true;
+}
+
+// Calls visit(i) for every pixel index a partial variant edits: every pixel in whole-image
+// mode, otherwise the pixels inside the (clipped) bounds whose mask byte is exactly 1, rows top
+// to bottom and columns left to right.
+template <class Visit>
+inline void for_each_selected(const uint8_t* mask, int32_t width, int32_t height, Rect bounds,
+                              Visit&& visit) {
+  if (!is_region(bounds)) {
+    const size_t n = static_cast<size_t>(pixel_count(width, height));
+    for (size_t i = 0; i < n; ++i) visit(i);
+    return;
+  }
+  const Rect r = clip_to_image(bounds, width, height);
+  for (int32_t y = r.top; y <= r.bottom; ++y) {
+    const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+    for (int32_t x = r.left; x <= r.right; ++x) {
+      const size_t i = row + static_cast<size_t>(x);
+      if (mask[i] == 1) visit(i);
+    }
+  }
+}
+
+// Checks shared by the partial variants: both pixel buffers present, a mask present whenever
+// the bounds select masked mode, and an image small enough to address.
+inline bool partial_args_ok(const uint32_t* src, const uint8_t* mask, const uint32_t* dst,
+                            int32_t width, int32_t height, const Rect& bounds) {
+  if (src == nullptr || dst == nullptr) return false;
+  if (is_region(bounds) && mask == nullptr) return false;
+  return pixel_count(width, height) <= kMaxPixels;
+}
+
+// Partial variant: copy the source into the destination, then apply the rule to the selected
+// pixels (see for_each_selected). Unselected pixels keep their source value.
+template <class Rule>
+inline bool edit_selected(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                          int32_t height, Rect bounds, Rule&& rule) {
+  if (!partial_args_ok(src, mask, dst, width, height, bounds)) return false;
+  copy_image(src, dst, pixel_count(width, height));
+  for_each_selected(mask, width, height, bounds, [&](size_t i) { dst[i] = rule(src[i]); });
+  return true;
+}
+
+}  // namespace pfx

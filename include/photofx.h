@@ -1,0 +1,101 @@
+/*
+ * photofx: photo effects on 32-bit ARGB pixel buffers, bit-exact on every platform.
+ *
+ * Pixels are 0xAARRGGBB words in row-major order with no gap between rows; masks are one byte
+ * per pixel and select a pixel when the byte is exactly 1. Region bounds (left, right, top,
+ * bottom) are inclusive; bounds with left > right or top > bottom mean "the whole image".
+ *
+ * Every effect has a camelCase entry point for hosts and an fx_ implementation that may also be
+ * called directly. Functions that can refuse their arguments return one of the PHOTOFX_ result
+ * codes; the entry points never pass those codes on.
+ *
+ * Valid C99 and C++.
+ */
+#ifndef PHOTOFX_H
+#define PHOTOFX_H
+
+#include <stdint.h>
+
+#if defined(PHOTOFX_BUILDING_LIBRARY) && defined(__GNUC__)
+#define PHOTOFX_API __attribute__((visibility("default")))
+#else
+#define PHOTOFX_API
+#endif
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* ---- Result codes ------------------------------------------------------------------------ */
+
+#define PHOTOFX_SUCCESS 40960          /* 0xA000: the call did its work */
+#define PHOTOFX_OUT_OF_MEMORY 40961    /* 0xA001: a scratch buffer could not be allocated */
+#define PHOTOFX_INVALID_ARGUMENT 40962 /* 0xA002: a null buffer or a level out of range */
+
+/* ---- Memory wrappers: every allocation, fill and whole-image copy of the library ---------- */
+
+PHOTOFX_API void* fx_calloc(uint32_t count, uint32_t size); /* zero-filled; null on failure */
+PHOTOFX_API void* fx_malloc(uint32_t count, uint32_t size); /* null when count x size overflows */
+PHOTOFX_API void* fx_realloc(void* ptr, uint32_t size);
+PHOTOFX_API void fx_free(void* ptr);
+PHOTOFX_API void* fx_memset(void* ptr, int32_t value, uint32_t count);   /* returns ptr */
+PHOTOFX_API void* fx_memcpy(void* dst, const void* src, uint32_t count); /* returns dst */
+
+/* ---- Channel packing ----------------------------------------------------------------------- */
+
+/* Splits a pixel into red, green and blue (0..255); alpha is not extracted. */
+PHOTOFX_API void fx_unpack_rgb888(int32_t pixel, int32_t* r, int32_t* g, int32_t* b);
+/* Alpha of `pixel` with the low 8 bits of r, g and b. */
+PHOTOFX_API uint32_t fx_pack_rgb888(uint32_t pixel, int32_t r, int32_t g, int32_t b);
+
+/* ---- HSV conversion: hue in whole degrees, saturation 16.16 (65536 = 1.0), value 0..255 ---- */
+
+PHOTOFX_API extern const uint32_t LUT_DELTA[256];  /* floor(65536 / i), entry 0 is 0 */
+PHOTOFX_API extern const uint32_t LUT_DELTA2[256]; /* 60 x LUT_DELTA[i] */
+PHOTOFX_API void fx_rgb2hsv(int32_t r, int32_t g, int32_t b, int32_t* h, int32_t* s, int32_t* v);
+PHOTOFX_API void fx_hsv2rgb(int32_t h, int32_t s, int32_t v, int32_t* r, int32_t* g, int32_t* b);
+
+/* ---- Brightness and contrast: level 0..20, 10 leaves the image as it is ------------------- */
+
+PHOTOFX_API void controlBrightness(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t level);
+PHOTOFX_API void controlBrightnessPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                          int32_t width, int32_t height, int32_t level,
+                                          int32_t left, int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void controlContrast(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                 int32_t level);
+PHOTOFX_API void controlContrastPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+
+PHOTOFX_API void fx_control_brightness_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                           int32_t height, int32_t level);
+PHOTOFX_API void fx_control_brightness(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t level, int32_t left,
+                                       int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_control_contrast_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                         int32_t height, int32_t level);
+PHOTOFX_API void fx_control_contrast(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                     int32_t width, int32_t height, int32_t level, int32_t left,
+                                     int32_t right, int32_t top, int32_t bottom);
+
+/* ---- 16.16 fixed point (65536 = 1.0); range errors are recorded in a per-thread error word - */
+
+PHOTOFX_API int32_t ftofix(double x);  /* nearest, halves away from zero, saturated */
+PHOTOFX_API double fixtof(int32_t x);  /* exact */
+PHOTOFX_API int32_t itofix(int32_t x); /* x << 16, wrapping */
+PHOTOFX_API int32_t fixtoi(int32_t x); /* nearest integer, halves upward */
+PHOTOFX_API int32_t fixfloor(int32_t x);
+PHOTOFX_API int32_t fixceil(int32_t x);           /* saturates at 32767 */
+PHOTOFX_API int32_t fixadd(int32_t a, int32_t b); /* saturated */
+PHOTOFX_API int32_t fixsub(int32_t a, int32_t b); /* saturated */
+PHOTOFX_API int32_t fixmul(int32_t a, int32_t b); /* rounded and saturated */
+PHOTOFX_API int32_t fixdiv(int32_t a, int32_t b); /* (a << 16) / b, saturated on b = 0 */
+PHOTOFX_API int32_t idiv(int32_t a, int32_t b);   /* rounded to nearest, halves away from 0 */
+PHOTOFX_API int32_t iidiv(int32_t a, int32_t b);  /* truncated, minus 1 when the signs differ */
+
+#ifdef __cplusplus
+} /* extern "C" */
+#endif
+
+#endif /* PHOTOFX_H */

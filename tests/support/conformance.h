@@ -1,0 +1,133 @@
+// Conformance goldens: every exported effect runs on fixed inputs and the hash of all it wrote
+// is compared with a value checked into the test. The same goldens hold on x86-64 and on ARMv7,
+// which is what proves the output is identical on both.
+//
+// Goldens are never regenerated to make a failure go away. To print the values for a new case,
+// run the test with PHOTOFX_PRINT_GOLDENS=1; it then reports every digest instead of failing.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "frame/frame.h"
+#include "support/images.h"
+
+namespace pfx::test {
+
+struct Input {
+  std::string name;
+  int32_t width, height;
+  Pixels pixels;
+  Mask mask;  // bytes from {0, 1, 2, 255}
+};
+
+inline Pixels load_argb(const std::string& path, size_t count) {
+  std::ifstream f(path, std::ios::binary);
+  std::vector<unsigned char> bytes((std::istreambuf_iterator<char>(f)),
+                                   std::istreambuf_iterator<char>());
+  Pixels px;
+  if (bytes.size() != count * 4) return px;
+  px.resize(count);
+  for (size_t i = 0; i < count; ++i) {
+    px[i] = uint32_t{bytes[4 * i]} | uint32_t{bytes[4 * i + 1]} << 8 |
+            uint32_t{bytes[4 * i + 2]} << 16 | uint32_t{bytes[4 * i + 3]} << 24;
+  }
+  return px;
+}
+
+// The real photograph crop, opaque, 64 x 48.
+inline Input photo_input() {
+  Pixels px = load_argb(std::string(PHOTOFX_TEST_DATA_DIR) + "/coffee_64x48.argb", 64 * 48);
+  EXPECT_EQ(px.size(), 64u * 48u) << "missing tests/data/coffee_64x48.argb";
+  return {"photo", 64, 48, px, random_mask(64, 48, 48)};
+}
+
+// Seeded noise with random alpha at an odd size.
+inline Input noise_input() {
+  return {"noise", 61, 37, random_image(61, 37, 2026), random_mask(61, 37, 37)};
+}
+
+inline const std::vector<Input>& conformance_inputs() {
+  static const std::vector<Input> inputs = {noise_input(), photo_input()};
+  return inputs;
+}
+
+// Region bounds of every mode: whole image (left > right), whole image (top > bottom), the full
+// rectangle, an inner rectangle and a single pixel.
+inline std::vector<Rect> conformance_bounds(int32_t w, int32_t h) {
+  return {{1, 0, 0, h - 1},
+          {0, w - 1, 1, 0},
+          {0, w - 1, 0, h - 1},
+          {w / 4, 3 * w / 4, h / 3, h - 2},
+          {w / 2, w / 2, h / 2, h / 2}};
+}
+
+// Accumulates everything an effect produced (pixels and result codes) into one 64-bit digest.
+class Digest {
+ public:
+  void add(const Pixels& px) { add(px.data(), px.size()); }
+  void add(const uint32_t* px, size_t n) {
+    mix(static_cast<uint64_t>(n));
+    mix(hash_pixels(px, n));
+  }
+  void add(int64_t value) { mix(static_cast<uint64_t>(value)); }
+  uint64_t value() const { return h_; }
+
+ private:
+  void mix(uint64_t v) {
+    for (int shift = 56; shift >= 0; shift -= 8) {
+      h_ ^= (v >> shift) & 0xFFu;
+      h_ *= 0x100000001B3ull;
+    }
+  }
+  uint64_t h_ = 0xCBF29CE484222325ull;
+};
+
+inline bool printing_goldens() {
+  const char* v = std::getenv("PHOTOFX_PRINT_GOLDENS");
+  return v != nullptr && *v != '\0' && *v != '0';
+}
+
+// Checks a digest against its golden, or prints it when goldens are being printed.
+#define EXPECT_GOLDEN(name, digest, golden)                                                       \
+  do {                                                                                            \
+    const uint64_t actual_ = (digest).value();                                                    \
+    if (::pfx::test::printing_goldens()) {                                                        \
+      std::printf("golden %-40s 0x%016llxull\n", name, static_cast<unsigned long long>(actual_)); \
+    } else {                                                                                      \
+      EXPECT_EQ(actual_, static_cast<uint64_t>(golden)) << "golden of " << name;                  \
+    }                                                                                             \
+  } while (0)
+
+// Runs a full variant fn(src, dst, w, h) on every input, into a second buffer and in place.
+template <class Fn>
+void digest_full(Digest& d, Fn fn) {
+  for (const Input& in : conformance_inputs()) {
+    Pixels out(in.pixels.size(), 0xA5A5A5A5u);
+    fn(in.pixels.data(), out.data(), in.width, in.height);
+    d.add(out);
+    Pixels in_place = in.pixels;
+    fn(in_place.data(), in_place.data(), in.width, in.height);
+    d.add(in_place);
+  }
+}
+
+// Runs a partial variant fn(src, mask, dst, w, h, Rect) on every input with every bounds mode.
+template <class Fn>
+void digest_partial(Digest& d, Fn fn) {
+  for (const Input& in : conformance_inputs()) {
+    for (const Rect& b : conformance_bounds(in.width, in.height)) {
+      Pixels out(in.pixels.size(), 0xA5A5A5A5u);
+      fn(in.pixels.data(), in.mask.data(), out.data(), in.width, in.height, b);
+      d.add(out);
+    }
+  }
+}
+
+}  // namespace pfx::test
