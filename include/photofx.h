@@ -94,6 +94,21 @@ PHOTOFX_API int32_t fixdiv(int32_t a, int32_t b); /* (a << 16) / b, saturated on
 PHOTOFX_API int32_t idiv(int32_t a, int32_t b);   /* rounded to nearest, halves away from 0 */
 PHOTOFX_API int32_t iidiv(int32_t a, int32_t b);  /* truncated, minus 1 when the signs differ */
 
+/* ---- Sharpen: each channel pushed away from the mean of its left and right neighbours ----- */
+
+/* Sharpens the whole image; dst may be src. Writes nothing if its scratch image is refused. */
+PHOTOFX_API void fx_apply_sharpen_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                      int32_t height);
+/* Sharpens the pixels whose mask byte is 1 (valid bounds only choose that mode, they do not
+ * limit it) or every pixel (empty bounds); level is ignored; the mask is never written. */
+PHOTOFX_API void fx_apply_sharpen(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                  int32_t width, int32_t height, int32_t level, int32_t left,
+                                  int32_t right, int32_t top, int32_t bottom);
+/* Entry point of fx_apply_sharpen. */
+PHOTOFX_API void applySharpen(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                              int32_t width, int32_t height, int32_t level, int32_t left,
+                              int32_t right, int32_t top, int32_t bottom);
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif
