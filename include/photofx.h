@@ -109,6 +109,25 @@ PHOTOFX_API void applySharpen(const uint32_t* src, const uint8_t* mask, uint32_t
                               int32_t width, int32_t height, int32_t level, int32_t left,
                               int32_t right, int32_t top, int32_t bottom);
 
+/* ---- Pixelize and red-eye: blocks of 2^shift pixels anchored at the origin, shift 0..31 --- */
+
+/* Every pixel takes the top-left pixel of its block; dst may be src. Other shifts: no-op. */
+PHOTOFX_API void applyPixelize(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t shift);
+/* Pixelizes img in place inside the closed disc of the given centre and radius. */
+PHOTOFX_API void rubPixelize(uint32_t* img, int32_t width, int32_t height, int32_t shift,
+                             int32_t cx, int32_t cy, int32_t radius);
+/* Darkens, in place, the red of pixels with 2 x red > 5 x green in the square cx, cy +- radius. */
+PHOTOFX_API void removeRedeye(uint32_t* img, int32_t width, int32_t height, int32_t cx, int32_t cy,
+                              int32_t radius);
+/* The implementations the three entry points above forward to. */
+PHOTOFX_API void fx_apply_pixelize(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t shift);
+PHOTOFX_API void fx_rub_pixelize(uint32_t* img, int32_t width, int32_t height, int32_t shift,
+                                 int32_t cx, int32_t cy, int32_t radius);
+PHOTOFX_API void fx_remove_redeye(uint32_t* img, int32_t width, int32_t height, int32_t cx,
+                                  int32_t cy, int32_t radius);
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif
