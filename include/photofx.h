@@ -128,6 +128,31 @@ PHOTOFX_API void fx_rub_pixelize(uint32_t* img, int32_t width, int32_t height, i
 PHOTOFX_API void fx_remove_redeye(uint32_t* img, int32_t width, int32_t height, int32_t cx,
                                   int32_t cy, int32_t radius);
 
+/* ---- Greyscale: mean of the channels times a gain, level 10 = the mean itself, 0..20 ------ */
+
+/* Full and partial entry points; they forward to fx_control_greyscale_all and _greyscale. */
+PHOTOFX_API void controlGreyscale(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                  int32_t level);
+PHOTOFX_API void controlGreyscalePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                         int32_t width, int32_t height, int32_t level, int32_t left,
+                                         int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_control_greyscale_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                          int32_t height, int32_t level);
+PHOTOFX_API void fx_control_greyscale(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t level, int32_t left,
+                                      int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Sepia: red lifted and blue lowered by two fixed curves; returns a result code -------- */
+
+/* Full variant (dst may be src) and partial variant; null src or dst: invalid argument. */
+PHOTOFX_API int32_t fx_apply_sepia(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API int32_t fx_apply_sepia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_get_sepia_r(int32_t value); /* red curve; values outside 0..255 as given */
+PHOTOFX_API int32_t fx_get_sepia_b(int32_t value); /* blue curve; values outside 0..255 as given */
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif
