@@ -7,8 +7,9 @@
 // nearest, halves away from zero. Entries closest to a half, checked against a 70-digit
 // computation: _acos_tbl[24] = 7223158.50036 (stored 7223159) and _acos_tbl[488] =
 // 1165449.49964 (stored 1165449); _tan_tbl[59] = 57949.50121 (57950, and -57950 at 197);
-// _cos_tbl[83] = 34379.50944 (34380). Double arithmetic is off by far less than these margins,
-// so the compiler's values and a <cmath> recomputation round alike; the tests check both.
+// _cos_tbl[83] = 34379.50944 (34380); fixtorad_r = 1608.49544 (1608). Double arithmetic is off by
+// far less than these margins, so the compiler's values and a <cmath> recomputation round alike;
+// the tests check both.
 #include "fixmath/fixed.h"
 #include "fixmath/table_math.h"
 #include "frame/table.h"
@@ -39,9 +40,10 @@ constexpr int32_t acos_entry(int32_t i) {
   return tmath::round_half_away(8388608.0 * tmath::acos_over_pi(i / 256.0 - 1.0));
 }
 
-// Nearest-entry index of an angle in the cosine table: a quarter step (0x4000) is added before
-// dropping the 15 fraction bits of a half unit. Unsigned, so that angles near INT32_MAX wrap
-// instead of overflowing; a 32-bit wrap is a whole number of turns, so it changes nothing.
+// The angle plus an offset, counted in table steps (half units). Adding a quarter step (0x4000)
+// before dropping the 15 low bits selects the nearest entry. Unsigned, so that angles near the
+// 32-bit ends wrap instead of overflowing; 2^32 is 256 whole turns, so the wrap cannot change
+// the masked index.
 constexpr uint32_t half_units(int32_t angle, uint32_t offset) {
   return (static_cast<uint32_t>(angle) + offset) >> 15;
 }
