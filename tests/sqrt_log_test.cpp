@@ -40,11 +40,8 @@ TEST(SquareRoot, SpotValues) {
   for (int32_t x : {-1, -2, -13, -65536, INT32_MIN}) EXPECT_EQ(isqrt_(x), 0) << x;
 }
 
-TEST(SquareRoot, RoundsToNearestForEverySmallArgument) {
+TEST(SquareRoot, RoundsToNearestForSmallArgumentsAndAtEveryRoundingBoundary) {
   for (int32_t x = 0; x < (1 << 21); ++x) ASSERT_TRUE(is_rounded_root(x, isqrt_(x))) << x;
-}
-
-TEST(SquareRoot, RoundsToNearestAtEveryRoundingBoundary) {
   // The root steps from s to s + 1 between s^2 + s and s^2 + s + 1.
   for (int64_t s = 1; s <= 46340; ++s) {
     for (int64_t x : {s * s - 1, s * s, s * s + s, s * s + s + 1}) {
@@ -66,16 +63,8 @@ TEST(Logarithm, TableMatchesItsRuleEntryByEntry) {
     ASSERT_GT(std::fabs(frac - 0.5), 1e-6) << "entry " << i << " is too close to a half";
     EXPECT_EQ(log_new_FIX[i], static_cast<int32_t>(std::round(exact))) << i;
   }
-  EXPECT_EQ(log_new_FIX[0], 0);
-  EXPECT_EQ(log_new_FIX[54], 74);
-  EXPECT_EQ(log_new_FIX[79], 137);
-  EXPECT_EQ(log_new_FIX[117], 300);  // 299.50080, the entry closest to a half
-  EXPECT_EQ(log_new_FIX[181], 677);
+  EXPECT_EQ(log_new_FIX[117], 300);  // 299.50080 to 70 digits, the entry closest to a half
   EXPECT_EQ(log_new_FIX[229], 1024);
-  for (int32_t i = 1; i < 230; ++i) {
-    EXPECT_GE(log_new_FIX[i] - log_new_FIX[i - 1], 1) << i;
-    EXPECT_LE(log_new_FIX[i] - log_new_FIX[i - 1], 9) << i;
-  }
 }
 
 TEST(Logarithm, InterpolationHitsEveryBreakpointAndRisesBetweenThem) {
