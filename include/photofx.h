@@ -94,6 +94,35 @@ PHOTOFX_API int32_t fixdiv(int32_t a, int32_t b); /* (a << 16) / b, saturated on
 PHOTOFX_API int32_t idiv(int32_t a, int32_t b);   /* rounded to nearest, halves away from 0 */
 PHOTOFX_API int32_t iidiv(int32_t a, int32_t b);  /* truncated, minus 1 when the signs differ */
 
+/* ---- Fixed-point trigonometry: angles in units of 1/256 turn (0x1000000 is a full turn) ----
+ * Domain errors (acos or asin outside -1.0 ... 1.0, fixatan2(0, 0)) store 33 in the error word
+ * and return 0. */
+
+PHOTOFX_API extern const int32_t _cos_tbl[512];  /* cos(2 pi i / 512) x 65536 */
+PHOTOFX_API extern const int32_t _tan_tbl[256];  /* tan(pi i / 256) x 65536; [128] is -0x7FFFFFFF */
+PHOTOFX_API extern const int32_t _acos_tbl[513]; /* acos(i / 256 - 1) in angle units */
+PHOTOFX_API extern const int32_t fixtorad_r;     /* radians per angle unit, for fixmul */
+PHOTOFX_API extern const int32_t radtofix_r;     /* angle units per radian, for fixmul */
+PHOTOFX_API int32_t fixcos(int32_t angle);       /* nearest entry; any angle wraps */
+PHOTOFX_API int32_t fixsin(int32_t angle);
+PHOTOFX_API int32_t fixtan(int32_t angle); /* -0x7FFFFFFF nearest a quarter turn */
+PHOTOFX_API int32_t fixatan(int32_t x);    /* -64.0 ... 63.5, within half a unit */
+/* Angle of the point (x, y), -128.0 ... 128.0; clears the error word unless x = y = 0. */
+PHOTOFX_API int32_t fixatan2(int32_t y, int32_t x);
+PHOTOFX_API int32_t fixacos(int32_t x); /* 0 ... 128.0 */
+PHOTOFX_API int32_t fixasin(int32_t x); /* -64.0 ... 64.0 */
+
+/* ---- Square root and logarithm; these leave the error word alone ------------------------- */
+
+PHOTOFX_API int32_t isqrt_(int32_t x); /* nearest integer square root; 0 for x <= 0 */
+/* 512 log2(v_i / 1024) at 230 breakpoints v_i from 1024 to 4096. */
+PHOTOFX_API extern const int32_t log_new_FIX[230];
+/* The table interpolated at v (1024 ... 4096 is 1.0 ... 4.0); below 1024 reads as 1024, 4096
+ * and above give 1024, a null table gives 0. */
+PHOTOFX_API int32_t log_interp_FIX(const int32_t* table, int32_t v);
+/* ln(x / 1024) x 2^20 for 5 <= x <= 4194304; 0 for x = 1; 21811200 for any other x. */
+PHOTOFX_API int32_t log_e_FIX_new(int32_t x);
+
 /* ---- Depth-of-field blur and tilt-shift ------------------------------------------------------
  * Blurs run on a working image: the photograph scaled down by 2^k per side (k from the longer
  * side: above 420, 850, 1650, 3250 pixels gives 1, 2, 3, 4), 3 bytes per sample (red, green,
