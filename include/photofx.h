@@ -180,6 +180,19 @@ PHOTOFX_API void fx_adjust_RGB(const uint32_t* src, const uint8_t* mask, uint32_
 PHOTOFX_API int32_t fx_change_colortone(const uint32_t* src, uint32_t* dst, int32_t width,
                                         int32_t height, int32_t hue);
 
+/* ---- Lighten and darken brushes: edit `image` in place inside a disc around (cx, cy) ------- */
+
+/* Strength 0..255 at the centre, fading to nothing at the radius; the disc becomes opaque. */
+PHOTOFX_API void rubLighten(uint32_t* image, int32_t cx, int32_t cy, int32_t width, int32_t height,
+                            int32_t strength, int32_t radius);
+PHOTOFX_API void rubDarken(uint32_t* image, int32_t cx, int32_t cy, int32_t width, int32_t height,
+                           int32_t strength, int32_t radius);
+
+PHOTOFX_API void fx_apply_lighten(uint32_t* image, int32_t cx, int32_t cy, int32_t width,
+                                  int32_t height, int32_t strength, int32_t radius);
+PHOTOFX_API void fx_apply_darken(uint32_t* image, int32_t cx, int32_t cy, int32_t width,
+                                 int32_t height, int32_t strength, int32_t radius);
+
 /* ---- 16.16 fixed point (65536 = 1.0); range errors are recorded in a per-thread error word - */
 
 PHOTOFX_API int32_t ftofix(double x);  /* nearest, halves away from zero, saturated */

@@ -1,4 +1,4 @@
-// Conformance goldens of the slider adjustments.
+// Conformance goldens of the slider adjustments and the lighten and darken brushes.
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -10,6 +10,7 @@ namespace {
 
 using pfx::Rect;
 using pfx::test::Digest;
+using pfx::test::Pixels;
 
 constexpr int32_t kLevels[] = {-3, 0, 4, 10, 13, 20, 27};
 // The slider levels and levels far beyond them, where no arithmetic may overflow.
@@ -159,6 +160,32 @@ TEST(Conformance, ColourTone) {
     });
   }
   EXPECT_GOLDEN("colour tone", d, 0x06a5ded8e53c2691ull);
+}
+
+// Brush strokes at the centre, the corners, across the edges and outside the image, with radii
+// from nothing to larger than the image and strengths beyond the intended range.
+TEST(Conformance, LightenDarken) {
+  struct Stroke {
+    int32_t cx, cy, strength, radius;
+  };
+  Digest d;
+  for (auto* brush : {&fx_apply_lighten, &fx_apply_darken}) {
+    for (const pfx::test::Input& in : pfx::test::conformance_inputs()) {
+      const int32_t w = in.width, h = in.height;
+      const Stroke strokes[] = {{w / 2, h / 2, 50, 7},   {0, 0, 255, 12},
+                                {w - 1, h - 1, 80, 5},   {-3, h / 3, 120, 9},
+                                {w + 2, 4, 200, 6},      {w / 3, h / 2, 0, 4},
+                                {5, 5, 90, 0},           {5, 5, 90, -4},
+                                {w / 2, h / 2, 30, 200}, {w / 2, 0, INT32_MAX, 10},
+                                {w / 4, h / 4, 100, 1}};
+      for (const Stroke& st : strokes) {
+        Pixels img = in.pixels;
+        brush(img.data(), st.cx, st.cy, w, h, st.strength, st.radius);
+        d.add(img);
+      }
+    }
+  }
+  EXPECT_GOLDEN("lighten and darken", d, 0xda08b8c76933e5d6ull);
 }
 
 }  // namespace
