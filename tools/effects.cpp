@@ -1,0 +1,131 @@
+// The registry: one entry per effect the command-line tool offers. See tools/effect.h for what
+// each field means; the table is checked when it is compiled (names, ranges, defaults).
+#include <string>
+#include <string_view>
+
+#include "photofx.h"
+#include "tools/effect.h"
+
+namespace fxtool {
+namespace {
+
+// clang-format off
+constexpr Effect kEffects[] = {
+    // ---- Tone and colour adjustments --------------------------------------------------------
+    {.name = "brightness",
+     .family = "adjust",
+     .summary = "lighter or darker: moves the luma and keeps the colour",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlBrightness, controlBrightnessPartial>,
+     .gallery = "level=0;level=5;level=15;level=20"},
+    {.name = "contrast",
+     .family = "adjust",
+     .summary = "pushes each channel away from mid grey, or draws it toward it below 10",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlContrast, controlContrastPartial>,
+     .gallery = "level=0;level=5;level=15;level=20"},
+};
+// clang-format on
+
+// ---- Checks on the table, made by the compiler ----------------------------------------------
+
+constexpr bool same(const char* a, const char* b) {
+  while (*a != '\0' && *a == *b) ++a, ++b;
+  return *a == *b;
+}
+
+// Lower-case words joined by '-', as command-line names are written.
+constexpr bool is_option_name(const char* s) {
+  if (*s == '\0' || *s == '-') return false;
+  char last = '\0';
+  for (; *s != '\0'; last = *s++) {
+    const bool ok = (*s >= 'a' && *s <= 'z') || (*s >= '0' && *s <= '9') || *s == '-';
+    if (!ok || (*s == '-' && last == '-')) return false;
+  }
+  return last != '-';
+}
+
+// The tool's own options; an effect parameter must not take one of these names.
+constexpr const char* kReserved[] = {"mask", "rect", "ellipse", "out-dir", "progress", "help"};
+
+constexpr bool param_ok(const Param& p) {
+  if (!is_option_name(p.name) || p.help == nullptr || p.help[0] == '\0') return false;
+  for (const char* r : kReserved) {
+    if (same(p.name, r)) return false;
+  }
+  switch (p.kind) {
+    case Kind::kChoice:
+      return p.extent == Extent::kNone && p.choices != nullptr && p.choice_count > 0 &&
+             p.def >= 0 && p.def < p.choice_count && static_cast<int32_t>(p.def) == p.def;
+    case Kind::kReal:
+      return p.extent == Extent::kNone && p.min <= p.def && p.def <= p.max;
+    case Kind::kInteger:
+      if (p.min != static_cast<int32_t>(p.min) || p.max != static_cast<int32_t>(p.max) ||
+          p.def != static_cast<int32_t>(p.def)) {
+        return false;
+      }
+      if (p.extent == Extent::kNone) return p.min <= p.def && p.def <= p.max;
+      return p.def >= 0 && p.def <= 1000 && p.min >= 0 && p.max <= 0;
+  }
+  return false;
+}
+
+constexpr bool effect_ok(const Effect& e) {
+  if (!is_option_name(e.name) || !is_option_name(e.family) || e.summary == nullptr ||
+      e.run == nullptr) {
+    return false;
+  }
+  const size_t n = e.param_count();
+  for (size_t i = n; i < kMaxParams; ++i) {
+    if (e.params[i].name != nullptr) return false;  // no gaps in the list
+  }
+  for (size_t i = 0; i < n; ++i) {
+    if (!param_ok(e.params[i])) return false;
+    for (size_t j = 0; j < i; ++j) {
+      if (same(e.params[i].name, e.params[j].name)) return false;
+    }
+  }
+  return true;
+}
+
+// Index of the first entry with a bad name, parameter, range or default, or of one that repeats
+// an earlier name; -1 when all are sound. The compiler shows the index when the check fails.
+constexpr int first_bad_entry() {
+  for (size_t i = 0; i < std::size(kEffects); ++i) {
+    if (!effect_ok(kEffects[i])) return static_cast<int>(i);
+    for (size_t j = 0; j < i; ++j) {
+      if (same(kEffects[i].name, kEffects[j].name)) return static_cast<int>(i);
+    }
+  }
+  return -1;
+}
+
+static_assert(first_bad_entry() == -1, "see the entry at this index of kEffects");
+
+}  // namespace
+
+std::span<const Effect> effects() { return kEffects; }
+
+const Effect* find_effect(std::string_view name) {
+  for (const Effect& e : kEffects) {
+    if (name == e.name) return &e;
+  }
+  return nullptr;
+}
+
+std::string result_code(int32_t code) {
+  switch (code) {
+    case PHOTOFX_SUCCESS:
+      return {};
+    case PHOTOFX_OUT_OF_MEMORY:
+      return "the library ran out of memory";
+    case PHOTOFX_INVALID_ARGUMENT:
+      return "the library refused the arguments";
+    default:
+      return "the library returned the unknown code " + std::to_string(code);
+  }
+}
+
+}  // namespace fxtool
