@@ -62,7 +62,6 @@ void say(const std::string& message) { std::fprintf(stderr, "photofx: %s\n", mes
 
 int usage_error(const std::string& message) {
   say(message);
-  std::fprintf(stderr, "(photofx help shows the usage)\n");
   return kUsage;
 }
 

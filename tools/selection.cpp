@@ -131,6 +131,7 @@ std::string make_selection(const SelectionSpec& spec, int32_t width, int32_t hei
 
 std::string run_effect(const Effect& effect, const Values& values, const Image& in,
                        const Selection* selection, Image& out) {
+  if (effect.run == nullptr) return std::string(effect.name) + " has no run function";
   if (selection != nullptr && effect.selects == Selects::kNothing) {
     return std::string(effect.name) + " takes no selection";
   }
