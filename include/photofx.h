@@ -94,6 +94,92 @@ PHOTOFX_API int32_t fixdiv(int32_t a, int32_t b); /* (a << 16) / b, saturated on
 PHOTOFX_API int32_t idiv(int32_t a, int32_t b);   /* rounded to nearest, halves away from 0 */
 PHOTOFX_API int32_t iidiv(int32_t a, int32_t b);  /* truncated, minus 1 when the signs differ */
 
+/* ---- Depth-of-field blur and tilt-shift ------------------------------------------------------
+ * Blurs run on a working image: the photograph scaled down by 2^k per side (k from the longer
+ * side: above 420, 850, 1650, 3250 pixels gives 1, 2, 3, 4), 3 bytes per sample (red, green,
+ * blue), with a working depth map of one byte per sample. Previews keep the working copies in
+ * the workspace globals below between an init call and a destroy call; one workspace exists at a
+ * time and each init releases the previous one of either kind. The workspace functions must not
+ * run concurrently. Blur levels run 0..7 (one to eight taps); any other value means the widest
+ * (nine taps). The caller's selection mask is never written. Images whose working copy would be
+ * narrower or lower than 2 samples come back as an unchanged copy of the source. */
+
+PHOTOFX_API extern uint8_t* g_ssrc;     /* working image of the source; null without workspace */
+PHOTOFX_API extern uint8_t* g_sblur;    /* blurred working image, rewritten by every preview */
+PHOTOFX_API extern uint8_t* g_tempd;    /* working depth map; null unless a blur workspace */
+PHOTOFX_API extern int32_t g_scaled_wd; /* working width of the last init */
+PHOTOFX_API extern int32_t g_scaled_ht; /* working height of the last init */
+PHOTOFX_API extern int32_t all; /* 1 when the last fx_Init_blur had empty bounds: blur everything */
+PHOTOFX_API extern int32_t resize_ratio; /* reduction shift k of the last fx_init_tiltshift */
+
+/* Nearest-sample reduction of a width x height image (or mask) to sw x sh samples. */
+PHOTOFX_API void scale_down_img(const uint32_t* src, int32_t width, int32_t height, uint8_t* out,
+                                int32_t sw, int32_t sh);
+PHOTOFX_API void scale_down_depth(const uint8_t* mask, int32_t width, int32_t height,
+                                  uint8_t* depth, int32_t sw, int32_t sh);
+
+/* Builds the blur workspace. Valid bounds blur the pixels whose mask byte is nonzero; empty
+ * bounds (left > right or top > bottom) blur the whole image and need no mask. */
+PHOTOFX_API void fx_Init_blur(const uint32_t* src, const uint8_t* mask, int32_t width,
+                              int32_t height, int32_t left, int32_t right, int32_t top,
+                              int32_t bottom);
+/* Blurs the workspace at `level` and composites it into dst; does nothing without a workspace.
+ * width and height must be those given to fx_Init_blur; dst may be src. */
+PHOTOFX_API void fx_make_blur_preview(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t level);
+/* Releases the blur workspace (and a tilt-shift workspace); harmless when there is none. */
+PHOTOFX_API void fx_destroy_blur(void);
+/* One-shot blur with private working copies; leaves the workspace alone. dst may be src. */
+PHOTOFX_API void fx_make_blur(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                              int32_t width, int32_t height, int32_t level, int32_t left,
+                              int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void applyBlur(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                           int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
+                           int32_t bottom);
+
+/* Separable blur of a working image; taps whose depth byte is not 1 stand in for the centre
+ * sample. dst may be src; on allocation failure dst is left as it was. */
+PHOTOFX_API void make_gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth,
+                                    int32_t width, int32_t height, int32_t level);
+/* Aperture blur of a working image (byte 0 read as blue, byte 2 as red); src and dst distinct. */
+PHOTOFX_API void make_lens_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth,
+                                int32_t width, int32_t height, int32_t level);
+/* Scales a blurred sw x sh working image up into dst through the depth map; pixels with a
+ * nonzero mask byte (every pixel while `all` is 1) are recomputed. dst may be src. */
+PHOTOFX_API void run_blur(const uint32_t* src, const uint8_t* blur, const uint8_t* mask,
+                          const uint8_t* depth, uint32_t* dst, int32_t width, int32_t height,
+                          int32_t sw, int32_t sh);
+
+/* Tilt-shift: rows within half_height of the centre row stay sharp; the blur fades in over half
+ * the distance from the band to the farther image edge. A band that leaves less than two rows
+ * to fade over keeps the whole image sharp. */
+PHOTOFX_API void initTiltShift(const uint32_t* src, int32_t width, int32_t height);
+PHOTOFX_API void makeTiltShift(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t centre, int32_t half_height);
+PHOTOFX_API void applyTiltShift(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                int32_t centre, int32_t half_height);
+PHOTOFX_API void destroyTiltShift(void);
+
+/* Builds the tilt-shift workspace (releasing any workspace of either kind). */
+PHOTOFX_API void fx_init_tiltshift(const uint32_t* src, int32_t width, int32_t height);
+/* Tilt-shift of src into dst from the workspace; does nothing without one. dst may be src. */
+PHOTOFX_API void fx_tiltshift_preview(const uint32_t* src, uint32_t* dst, int32_t width,
+                                      int32_t height, int32_t centre, int32_t half_height);
+/* One-shot tilt-shift with private working copies. dst may be src. */
+PHOTOFX_API void fx_apply_tiltshift(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height, int32_t centre, int32_t half_height);
+/* Releases g_ssrc and g_sblur; a blur workspace's depth map stays until fx_destroy_blur. */
+PHOTOFX_API void fx_destroy_tiltshift(void);
+/* The widest Gaussian blur of a working image, every sample counted. dst may be src. */
+PHOTOFX_API void make_tiltshift(const uint8_t* src, uint8_t* dst, int32_t width, int32_t height);
+/* Scales a blurred working image up and mixes it with src by each row's sharpness. */
+PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t sw, int32_t sh,
+                                   int32_t centre, int32_t half_height);
+/* Widest lens blur of a working image whose luma leans toward each sample's own near the band. */
+PHOTOFX_API void make_tiltshift_lens(const uint8_t* src, uint8_t* dst, int32_t width,
+                                     int32_t height, int32_t centre, int32_t half_height);
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif
