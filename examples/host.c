@@ -1,10 +1,10 @@
 /* A minimal host of the library, in plain C99 with no other dependency: it makes a picture in
- * memory, brightens all of it, raises the contrast inside a round selection, and writes the
- * result as a binary PPM file.
+ * memory, brightens all of it, raises the contrast inside a round selection, blurs the rest
+ * through a preview session, and writes the result as a binary PPM file.
  *
  *   host_example [OUT.ppm]     (default: photofx-host.ppm)
  *
- * It prints a checksum of the result, the same on every platform. */
+ * It prints a checksum of each preview, the same on every platform. */
 #include <stdio.h>
 #include <stdlib.h>
 
@@ -70,16 +70,23 @@ int main(int argc, char** argv) {
   }
   controlContrastPartial(work, mask, dst, width, height, 18, cx - radius, cx + radius, cy - radius,
                          cy + radius);
-
-  /* ---- BLUR PREVIEW SESSION -------------------------------------------------------------
-   * To be filled in when the blur effects are in the library: fx_Init_blur once with the
-   * picture, the mask and the bounds; fx_make_blur_preview for each slider position a user
-   * tries; fx_destroy_blur when the session ends.
-   * ------------------------------------------------------------------------------------- */
-
   printf("host_example: %dx%d, brightness 14, contrast 18 in a disc: checksum %08lx\n", (int)width,
          (int)height, (unsigned long)checksum(dst, n));
-  if (!write_ppm(out_path, dst, width, height)) {
+
+  /* A blur preview session, as an editor runs one behind a slider: the workspace is built once
+   * from the picture and a selection (here everything outside the disc), then each slider
+   * position costs one preview call; the last one shown is kept. Bounds around the whole image
+   * select masked mode, so only pixels whose mask byte is nonzero are blurred. */
+  for (size_t i = 0; i < n; ++i) mask[i] = (uint8_t)(mask[i] == 0);
+  fx_Init_blur(dst, mask, width, height, 0, width - 1, 0, height - 1);
+  for (int32_t level = 1; level <= 5; level += 2) {
+    fx_make_blur_preview(dst, mask, work, width, height, level);
+    printf("host_example: blur preview at level %d: checksum %08lx\n", (int)level,
+           (unsigned long)checksum(work, n));
+  }
+  fx_destroy_blur();
+
+  if (!write_ppm(out_path, work, width, height)) {
     fprintf(stderr, "host_example: cannot write %s\n", out_path);
     goto done;
   }

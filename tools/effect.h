@@ -136,6 +136,11 @@ constexpr Param row(const char* name, int32_t permille, const char* help) {
       .name = name, .help = help, .extent = Extent::kHeight, .max = -1, .def = double(permille)};
 }
 
+// A number of rows, 0 .. height.
+constexpr Param rows(const char* name, int32_t permille, const char* help) {
+  return {.name = name, .help = help, .extent = Extent::kHeight, .def = double(permille)};
+}
+
 // A length in pixels, min .. the image's longer side.
 constexpr Param length(const char* name, int32_t min, int32_t permille, const char* help) {
   return {.name = name,

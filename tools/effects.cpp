@@ -26,6 +26,54 @@ constexpr Effect kEffects[] = {
      .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
      .run = full_and_partial<controlContrast, controlContrastPartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
+
+    // ---- Blur ---------------------------------------------------------------------------------
+    {.name = "blur",
+     .family = "blur",
+     .summary = "soft blur of the selection, or of everything, on a scaled-down copy",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
+     .run = [](const Call& c) {
+       const Bounds& b = c.bounds;
+       applyBlur(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(0), b.left, b.right,
+                 b.top, b.bottom);
+       return std::string();
+     },
+     .gallery = "level=0;level=4;level=8"},
+    {.name = "blur-preview",
+     .family = "blur",
+     .summary = "the same blur through a preview session, as an editor's slider runs it",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
+     .run = [](const Call& c) {
+       const Bounds& b = c.bounds;
+       fx_Init_blur(c.src(), c.mask, c.width(), c.height(), b.left, b.right, b.top, b.bottom);
+       fx_make_blur_preview(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(0));
+       fx_destroy_blur();
+       return std::string();
+     },
+     .gallery = "level=4"},
+    {.name = "tilt-shift",
+     .family = "blur",
+     .summary = "a sharp horizontal band, the picture blurring away above and below it",
+     .selects = Selects::kByTool,
+     .params = {row("centre", 500, "the row in the middle of the sharp band"),
+                rows("half-height", 125, "rows kept sharp on each side of the centre")},
+     .run = full_only<applyTiltShift>,
+     .gallery = ""},
+    {.name = "tilt-shift-preview",
+     .family = "blur",
+     .summary = "the same tilt-shift through a preview session",
+     .selects = Selects::kByTool,
+     .params = {row("centre", 500, "the row in the middle of the sharp band"),
+                rows("half-height", 125, "rows kept sharp on each side of the centre")},
+     .run = [](const Call& c) {
+       initTiltShift(c.src(), c.width(), c.height());
+       makeTiltShift(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.arg(1));
+       destroyTiltShift();
+       return std::string();
+     },
+     .gallery = ""},
 };
 // clang-format on
 

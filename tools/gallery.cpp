@@ -166,6 +166,18 @@ std::vector<std::string> gallery_items(const char* gallery) {
   return items;
 }
 
+// Every parameter's value as it was used: "centre=200,half-height=50".
+std::string settings_text(const Effect& effect, const Values& values) {
+  std::string text;
+  for (size_t k = 0; k < effect.param_count(); ++k) {
+    if (k > 0) text += ',';
+    text.append(effect.params[k].name)
+        .append("=")
+        .append(format_value(effect.params[k], values[k]));
+  }
+  return text;
+}
+
 std::string size_text(const Image& img) {
   return std::to_string(img.width) + "x" + std::to_string(img.height);
 }
@@ -205,7 +217,8 @@ std::string make_gallery(const Image& photo, const std::string& source, const st
       const std::string file = picture_name(*effect, item);
       if (err.empty()) err = write_image(dir + "/" + file, out);
       if (!err.empty()) return label + ": " + err;
-      shown.push_back({file, effect->name, item, effect->summary, thumbnail(out)});
+      shown.push_back(
+          {file, effect->name, settings_text(*effect, values), effect->summary, thumbnail(out)});
       ++pictures;
     }
   }
