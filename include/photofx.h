@@ -79,6 +79,120 @@ PHOTOFX_API void fx_control_contrast(const uint32_t* src, const uint8_t* mask, u
                                      int32_t width, int32_t height, int32_t level, int32_t left,
                                      int32_t right, int32_t top, int32_t bottom);
 
+/* ---- Saturation and temperature: level 0..20, 10 neutral ---------------------------------- */
+
+/* Level 0 is grey, 20 about doubles each colour's distance from grey. */
+PHOTOFX_API void controlSaturation(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t level);
+PHOTOFX_API void controlSaturationPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                          int32_t width, int32_t height, int32_t level,
+                                          int32_t left, int32_t right, int32_t top, int32_t bottom);
+/* Above 10 warmer (less blue, more red), below 10 cooler. */
+PHOTOFX_API void controlTemperature(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height, int32_t level);
+PHOTOFX_API void controlTemperaturePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t level,
+                                           int32_t left, int32_t right, int32_t top,
+                                           int32_t bottom);
+
+PHOTOFX_API void fx_control_saturation_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                           int32_t height, int32_t level);
+PHOTOFX_API void fx_control_saturation(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t level, int32_t left,
+                                       int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_control_temperature_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                            int32_t height, int32_t level);
+PHOTOFX_API void fx_control_temperature(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Exposure and hue: level 0..20, 10 neutral; the fx_ functions return a result code ---- */
+
+/* Each channel times level / 10: 0 is black, 20 doubles. */
+PHOTOFX_API void controlExposure(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                 int32_t level);
+/* Valid bounds select masked mode, which edits every pixel of the image whose mask byte is 1. */
+PHOTOFX_API void controlExposurePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+/* Turns the hue by 18 degrees per step from 10. */
+PHOTOFX_API void controlHue(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                            int32_t level);
+PHOTOFX_API void controlHuePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t level, int32_t left,
+                                   int32_t right, int32_t top, int32_t bottom);
+
+PHOTOFX_API int32_t fx_control_exposure_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                            int32_t height, int32_t level);
+PHOTOFX_API int32_t fx_control_exposure(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_control_hue_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                       int32_t height, int32_t level);
+PHOTOFX_API int32_t fx_control_hue(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t level, int32_t left,
+                                   int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Faded colour (level 0..100 percent, others refused) and invert; fx_ return a code ----- */
+
+/* Blends toward a washed-out, warm-tinted copy; 0 unchanged, 100 fully faded. */
+PHOTOFX_API void controlFadedColour(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height, int32_t level);
+PHOTOFX_API void controlFadedColourPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t level,
+                                           int32_t left, int32_t right, int32_t top,
+                                           int32_t bottom);
+/* Each colour channel becomes 255 minus itself. */
+PHOTOFX_API void applyInvert(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyInvertPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                    int32_t width, int32_t height, int32_t left, int32_t right,
+                                    int32_t top, int32_t bottom);
+
+PHOTOFX_API int32_t fx_control_fadedcolor_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                              int32_t height, int32_t level);
+/* Refuses a null mask even when the bounds select the whole image. */
+PHOTOFX_API int32_t fx_control_fadedcolor(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                          int32_t width, int32_t height, int32_t level,
+                                          int32_t left, int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_apply_invert_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                        int32_t height);
+/* Refuses a null mask even when the bounds select the whole image. */
+PHOTOFX_API int32_t fx_apply_invert(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                    int32_t width, int32_t height, int32_t left, int32_t right,
+                                    int32_t top, int32_t bottom);
+
+/* ---- Channel gains (red, green, blue 0..20, 10 neutral) and colour tone -------------------- */
+
+/* A step on one slider adds 6 to its channel and takes 3 from each of the others. */
+PHOTOFX_API void controlAdjustRGB(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                  int32_t red, int32_t green, int32_t blue);
+PHOTOFX_API void AdjustRGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                           int32_t height, int32_t red, int32_t green, int32_t blue, int32_t left,
+                           int32_t right, int32_t top, int32_t bottom);
+
+PHOTOFX_API void fx_adjust_RGB_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t red, int32_t green, int32_t blue);
+PHOTOFX_API void fx_adjust_RGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                               int32_t width, int32_t height, int32_t red, int32_t green,
+                               int32_t blue, int32_t left, int32_t right, int32_t top,
+                               int32_t bottom);
+/* Repaints the image in one hue (0..360 degrees, others refused) at saturation 0.3. */
+PHOTOFX_API int32_t fx_change_colortone(const uint32_t* src, uint32_t* dst, int32_t width,
+                                        int32_t height, int32_t hue);
+
+/* ---- Lighten and darken brushes: edit `image` in place inside a disc around (cx, cy) ------- */
+
+/* Strength 0..255 at the centre, fading to nothing at the radius; the disc becomes opaque. */
+PHOTOFX_API void rubLighten(uint32_t* image, int32_t cx, int32_t cy, int32_t width, int32_t height,
+                            int32_t strength, int32_t radius);
+PHOTOFX_API void rubDarken(uint32_t* image, int32_t cx, int32_t cy, int32_t width, int32_t height,
+                           int32_t strength, int32_t radius);
+
+PHOTOFX_API void fx_apply_lighten(uint32_t* image, int32_t cx, int32_t cy, int32_t width,
+                                  int32_t height, int32_t strength, int32_t radius);
+PHOTOFX_API void fx_apply_darken(uint32_t* image, int32_t cx, int32_t cy, int32_t width,
+                                 int32_t height, int32_t strength, int32_t radius);
+
 /* ---- 16.16 fixed point (65536 = 1.0); range errors are recorded in a per-thread error word - */
 
 PHOTOFX_API int32_t ftofix(double x);  /* nearest, halves away from zero, saturated */
@@ -93,6 +207,35 @@ PHOTOFX_API int32_t fixmul(int32_t a, int32_t b); /* rounded and saturated */
 PHOTOFX_API int32_t fixdiv(int32_t a, int32_t b); /* (a << 16) / b, saturated on b = 0 */
 PHOTOFX_API int32_t idiv(int32_t a, int32_t b);   /* rounded to nearest, halves away from 0 */
 PHOTOFX_API int32_t iidiv(int32_t a, int32_t b);  /* truncated, minus 1 when the signs differ */
+
+/* ---- Fixed-point trigonometry: angles in units of 1/256 turn (0x1000000 is a full turn) ----
+ * Domain errors (acos or asin outside -1.0 ... 1.0, fixatan2(0, 0)) store 33 in the error word
+ * and return 0. */
+
+PHOTOFX_API extern const int32_t _cos_tbl[512];  /* cos(2 pi i / 512) x 65536 */
+PHOTOFX_API extern const int32_t _tan_tbl[256];  /* tan(pi i / 256) x 65536; [128] is -0x7FFFFFFF */
+PHOTOFX_API extern const int32_t _acos_tbl[513]; /* acos(i / 256 - 1) in angle units */
+PHOTOFX_API extern const int32_t fixtorad_r;     /* radians per angle unit, for fixmul */
+PHOTOFX_API extern const int32_t radtofix_r;     /* angle units per radian, for fixmul */
+PHOTOFX_API int32_t fixcos(int32_t angle);       /* nearest entry; any angle wraps */
+PHOTOFX_API int32_t fixsin(int32_t angle);
+PHOTOFX_API int32_t fixtan(int32_t angle); /* -0x7FFFFFFF nearest a quarter turn */
+PHOTOFX_API int32_t fixatan(int32_t x);    /* -64.0 ... 63.5, within half a unit */
+/* Angle of the point (x, y), -128.0 ... 128.0; clears the error word unless x = y = 0. */
+PHOTOFX_API int32_t fixatan2(int32_t y, int32_t x);
+PHOTOFX_API int32_t fixacos(int32_t x); /* 0 ... 128.0 */
+PHOTOFX_API int32_t fixasin(int32_t x); /* -64.0 ... 64.0 */
+
+/* ---- Square root and logarithm; these leave the error word alone ------------------------- */
+
+PHOTOFX_API int32_t isqrt_(int32_t x); /* nearest integer square root; 0 for x <= 0 */
+/* 512 log2(v_i / 1024) at 230 breakpoints v_i from 1024 to 4096. */
+PHOTOFX_API extern const int32_t log_new_FIX[230];
+/* The table interpolated at v (1024 ... 4096 is 1.0 ... 4.0); below 1024 reads as 1024, 4096
+ * and above give 1024, a null table gives 0. */
+PHOTOFX_API int32_t log_interp_FIX(const int32_t* table, int32_t v);
+/* ln(x / 1024) x 2^20 for 5 <= x <= 4194304; 0 for x = 1; 21811200 for any other x. */
+PHOTOFX_API int32_t log_e_FIX_new(int32_t x);
 
 /* ---- Depth-of-field blur and tilt-shift ------------------------------------------------------
  * Blurs run on a working image: the photograph scaled down by 2^k per side (k from the longer
