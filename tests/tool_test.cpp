@@ -65,6 +65,14 @@ Image tilt_shift(const Image& src, int32_t centre, int32_t half_height) {
   return out;
 }
 
+// The library's result for a call that fills its second buffer from its first.
+Image lib(const Image& src,
+          const std::function<void(const uint32_t*, uint32_t*, int32_t, int32_t)>& call) {
+  Image out = src;
+  call(src.pixels.data(), out.pixels.data(), src.width, src.height);
+  return out;
+}
+
 // Mask bytes of 1 in columns x0..x1 and rows y0..y1, 0 elsewhere.
 std::vector<uint8_t> rect_mask(int32_t x0, int32_t y0, int32_t x1, int32_t y1) {
   std::vector<uint8_t> mask(static_cast<size_t>(kWidth) * kHeight, 0);
@@ -154,6 +162,68 @@ TEST_F(Tool, EachEffectFamilyMatchesTheLibrary) {
          Image o = s;
          controlContrast(s.pixels.data(), o.pixels.data(), s.width, s.height, 17);
          return o;
+       }},
+      {{"saturation", "--level", "16", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlSaturationPartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 16, 3, 11, 2, 7);
+         });
+       }},
+      {{"temperature", "--level", "4"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlTemperature(a, b, w, h, 4);
+         });
+       }},
+      {{"exposure", "--level", "13"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlExposure(a, b, w, h, 13);
+         });
+       }},
+      {{"hue", "--level", "3", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlHuePartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 3, 3, 11, 2, 7);
+         });
+       }},
+      {{"faded-colour", "--level", "60"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlFadedColour(a, b, w, h, 60);
+         });
+       }},
+      {{"invert", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           applyInvertPartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 3, 11, 2, 7);
+         });
+       }},
+      {{"channel-gains", "--red", "15", "--green", "3", "--blue", "12"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlAdjustRGB(a, b, w, h, 15, 3, 12);
+         });
+       }},
+      {{"colour-tone", "--hue", "200"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           fx_change_colortone(a, b, w, h, 200);
+         });
+       }},
+      // The brushes edit in place; the defaults are the middle of the image and a quarter of
+      // its longer side.
+      {{"lighten", "--cx", "5", "--cy", "6", "--strength", "80", "--radius", "7"},
+       [](const Image& s) {
+         Image o = s;
+         rubLighten(o.pixels.data(), 5, 6, s.width, s.height, 80, 7);
+         return o;
+       }},
+      {{"darken", "--rect", "0,0,10,30"},
+       [](const Image& s) {
+         Image full = s;
+         rubDarken(full.pixels.data(), 11, 8, s.width, s.height, 64, 5);
+         return where(s, full, [](int32_t x, int32_t) { return x < 10; });
        }},
       {{"blur", "--level", "5"},
        [](const Image& s) {
@@ -384,6 +454,9 @@ TEST_F(Tool, UnusableFilesAreRefusedWithStatusOne) {
                  "--rect 23,0,5,5 lies outside the 23x17 image");
   expect_refused({"apply", "brightness", "--ellipse", "-3,5,2,2", in, out}, 1,
                  "--ellipse -3,5,2,2 lies outside the 23x17 image");
+  // Positions are checked against each picture, so they fail per file.
+  expect_refused({"apply", "lighten", "--cx", "23", in, out}, 1,
+                 "--cx 23 is out of range 0..22 for a 23x17 image");
   expect_refused({"apply", "brightness", in, dir / "no-dir/out.png"}, 1,
                  "out.png: cannot write: No such file or directory");
   expect_refused({"gallery", dir / "missing.png", "-o", dir / "g"}, 1, "missing.png: cannot open");
