@@ -1,0 +1,135 @@
+#!/usr/bin/env python3
+"""Tests of bench/report's arithmetic: which figure a row is divided by, which goal applies and
+whether it is met, and how failures surface. Runs on made-up results, no benchmark needed."""
+import importlib.machinery
+import importlib.util
+import json
+import os
+import tempfile
+import unittest
+
+HERE = os.path.dirname(os.path.abspath(__file__))
+_loader = importlib.machinery.SourceFileLoader("report", os.path.join(HERE, "report"))
+_spec = importlib.util.spec_from_loader("report", _loader)
+report = importlib.util.module_from_spec(_spec)
+_loader.exec_module(report)
+
+
+def bench(name, ms, label="", peak=0.0, px=12e6, aggregate="median", error=None):
+    """One entry as Google Benchmark writes it to JSON."""
+    b = {"name": f"{name}_{aggregate}" if aggregate else name, "run_name": name,
+         "run_type": "aggregate" if aggregate else "iteration", "cpu_time": ms,
+         "time_unit": "ms", "items_per_second": px / (ms / 1e3), "label": label,
+         "scratch_peak": peak, "scratch_kept": 0.0, "image_px": px}
+    if aggregate:
+        b["aggregate_name"] = aggregate
+    if error:
+        b = {"name": name, "run_name": name, "run_type": "iteration", "error_occurred": True,
+             "error_message": error}
+    return b
+
+
+def rows_of(entries):
+    data = {"benchmarks": entries}
+    results = report.parse_results(data)
+    order = []
+    for e in entries:
+        n = report.base_name(e["run_name"])
+        if n not in order:
+            order.append(n)
+    return {r.result.name: r for r in report.evaluate(results, order)}
+
+
+class Goals(unittest.TestCase):
+    def test_point_operation_is_held_to_twice_memcpy(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("fast/full/12mp", 15, "goal=memcpy*2"),
+                        bench("slow/full/12mp", 25, "goal=memcpy*2")])
+        self.assertAlmostEqual(rows["fast/full/12mp"].x_memcpy, 1.5)
+        self.assertIs(rows["fast/full/12mp"].met, True)
+        self.assertAlmostEqual(rows["slow/full/12mp"].x_memcpy, 2.5)
+        self.assertIs(rows["slow/full/12mp"].met, False)
+        self.assertEqual(rows["slow/full/12mp"].goal_text, "≤ 2× memcpy")
+
+    def test_peer_goal_divides_by_the_peer_of_the_same_size(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("peer/cv-hsv/12mp", 20, "reference"),
+                        bench("peer/cv-hsv/preview", 1, "reference", px=777600),
+                        bench("hue/full/12mp", 30, "goal=peer*1 peer=cv-hsv")])
+        hue = rows["hue/full/12mp"]
+        self.assertAlmostEqual(hue.x_peer, 1.5)
+        self.assertIs(hue.met, False)
+        # In the chart the goal is drawn where the peer's own bar ends.
+        self.assertAlmostEqual(hue.goal_memcpy, 2.0)
+
+    def test_photo_only_goal_does_not_apply_to_the_preview_size(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("floor/memcpy/preview", 1, "reference", px=777600),
+                        bench("blur-preview/full/12mp", 30, "goal=memcpy*4@12mp"),
+                        bench("blur-preview/full/preview", 30, "goal=memcpy*4@12mp", px=777600)])
+        self.assertIs(rows["blur-preview/full/12mp"].met, True)
+        self.assertEqual(rows["blur-preview/full/preview"].goal_text, "")
+        self.assertIsNone(rows["blur-preview/full/preview"].met)
+
+    def test_scratch_goal_counts_bytes_per_pixel_beside_time(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("lean/full/12mp", 30, "goal=memcpy*4 scratch<=8", peak=8 * 12e6),
+                        bench("fat/full/12mp", 30, "goal=memcpy*4 scratch<=8", peak=9 * 12e6)])
+        self.assertIs(rows["lean/full/12mp"].met, True)
+        self.assertAlmostEqual(rows["fat/full/12mp"].bytes_per_px, 9.0)
+        self.assertIs(rows["fat/full/12mp"].met, False)
+
+    def test_goal_without_its_peer_is_not_judged(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("hue/full/12mp", 5, "goal=peer*1 peer=cv-hsv")])
+        self.assertIsNone(rows["hue/full/12mp"].met)
+        self.assertIn("?", report.row_cells(rows["hue/full/12mp"]))
+        self.assertIn("1 not judged", report.summary(list(rows.values())))
+
+
+class Results(unittest.TestCase):
+    def test_median_is_used_not_mean(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("x/full/12mp", 100, "goal=memcpy*2", aggregate="mean"),
+                        bench("x/full/12mp", 15, "goal=memcpy*2", aggregate="median"),
+                        bench("x/full/12mp", 30, "goal=memcpy*2", aggregate="stddev")])
+        self.assertAlmostEqual(rows["x/full/12mp"].x_memcpy, 1.5)
+
+    def test_short_runs_carry_their_iteration_count_in_the_name(self):
+        self.assertEqual(report.base_name("sepia/partial/12mp/iterations:2"), "sepia/partial/12mp")
+        self.assertEqual(report.base_name("a/full/preview/min_time:0.100/repeats:3"),
+                         "a/full/preview")
+        rows = rows_of([bench("floor/memcpy/12mp/iterations:2", 10, "reference", aggregate=None),
+                        bench("x/full/12mp/iterations:2", 10, "goal=memcpy*2", aggregate=None)])
+        self.assertIs(rows["x/full/12mp"].met, True)
+
+    def test_failed_benchmark_is_reported_and_fails_the_run(self):
+        entries = [bench("floor/memcpy/12mp", 10, "reference"),
+                   bench("x/full/12mp", 1, error="the call wrote nothing")]
+        rows = rows_of(entries)
+        self.assertIn("failed: the call wrote nothing", report.row_cells(rows["x/full/12mp"]))
+        with tempfile.TemporaryDirectory() as d:
+            path = os.path.join(d, "r.json")
+            with open(path, "w") as f:
+                json.dump({"benchmarks": entries}, f)
+            with self.assertRaises(SystemExit) as e:
+                report.main(["--from-json", path, "--out", d, "--chart", "/bin/true"])
+            self.assertEqual(e.exception.code, 1)
+            with open(os.path.join(d, "performance.md")) as f:
+                self.assertIn("failed: the call wrote nothing", f.read())
+
+    def test_chart_gets_one_bar_per_row_coloured_by_its_goal(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("a/full/12mp", 15, "goal=memcpy*2"),
+                        bench("a/partial/12mp", 40, ""),
+                        bench("b/full/12mp", 50, "goal=memcpy*2")])
+        spec = report.chart_spec(list(rows.values()), "T").splitlines()
+        self.assertEqual(spec[:2], ["title\tT", "panel\t" + report.SIZES["12mp"]])
+        self.assertEqual(spec[2:], ["bar\tmemcpy\t1\t0\treference",
+                                    "bar\ta\t1.5\t2\tmet",
+                                    "bar\ta partial\t4\t0\tnone",
+                                    "bar\tb\t5\t2\tmissed"])
+
+
+if __name__ == "__main__":
+    unittest.main()
