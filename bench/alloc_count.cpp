@@ -27,8 +27,8 @@ std::atomic<int64_t> g_peak{0};
 
 void note_alloc(void* p) {
   if (p == nullptr || !g_counting.load(std::memory_order_relaxed)) return;
-  const int64_t now = g_live.fetch_add(static_cast<int64_t>(malloc_usable_size(p))) +
-                      static_cast<int64_t>(malloc_usable_size(p));
+  const int64_t size = static_cast<int64_t>(malloc_usable_size(p));
+  const int64_t now = g_live.fetch_add(size) + size;
   int64_t peak = g_peak.load();
   while (now > peak && !g_peak.compare_exchange_weak(peak, now)) {
   }

@@ -258,6 +258,26 @@ bool single_thread_opencv(Scene& scene) {
   return thread_count() == 1;
 }
 
+// The processor's name, for the report.
+std::string cpu_name() {
+  std::FILE* f = std::fopen("/proc/cpuinfo", "r");
+  if (f == nullptr) return "unknown";
+  char line[256];
+  std::string name = "unknown";
+  while (std::fgets(line, sizeof line, f) != nullptr) {
+    if (std::strncmp(line, "model name", 10) == 0) {
+      const char* colon = std::strchr(line, ':');
+      if (colon != nullptr) {
+        name = colon + 1 + std::strspn(colon + 1, " \t");
+        name.erase(name.find_last_not_of(" \n") + 1);
+      }
+      break;
+    }
+  }
+  std::fclose(f);
+  return name;
+}
+
 // The scratch figures are only as good as the counting: the library's own allocation must show.
 bool counting_sees_library() {
   start_counting();
@@ -309,6 +329,7 @@ int main(int argc, char** argv) {
   fxbench::register_all(*photo12, short_run);
   fxbench::register_all(*preview, short_run);
   benchmark::AddCustomContext("photo", photo_path);
+  benchmark::AddCustomContext("cpu", fxbench::cpu_name());
   benchmark::AddCustomContext("opencv", CV_VERSION);
   benchmark::AddCustomContext("compiler", __VERSION__);
   benchmark::AddCustomContext("library_flags", PHOTOFX_BENCH_FLAGS);

@@ -1,18 +1,28 @@
 #!/usr/bin/env python3
-"""Tests of bench/report's arithmetic: which figure a row is divided by, which goal applies and
-whether it is met, and how failures surface. Runs on made-up results, no benchmark needed."""
+"""Tests of bench/report's arithmetic (which figure a row is divided by, which goal applies and
+whether it is met, how failures surface) on made-up results, and of the chart it draws with
+photofx_chart (named by the PHOTOFX_CHART environment variable; skipped without it)."""
 import importlib.machinery
 import importlib.util
 import json
+import math
 import os
+import subprocess
 import tempfile
 import unittest
 
 HERE = os.path.dirname(os.path.abspath(__file__))
-_loader = importlib.machinery.SourceFileLoader("report", os.path.join(HERE, "report"))
-_spec = importlib.util.spec_from_loader("report", _loader)
-report = importlib.util.module_from_spec(_spec)
-_loader.exec_module(report)
+
+
+def load(name, path):
+    loader = importlib.machinery.SourceFileLoader(name, path)
+    module = importlib.util.module_from_spec(importlib.util.spec_from_loader(name, loader))
+    loader.exec_module(module)
+    return module
+
+
+report = load("report", os.path.join(HERE, "report"))
+png = load("make_crop", os.path.join(os.path.dirname(HERE), "tests", "data", "make_crop.py"))
 
 
 def bench(name, ms, label="", peak=0.0, px=12e6, aggregate="median", error=None):
@@ -129,6 +139,42 @@ class Results(unittest.TestCase):
                                     "bar\ta\t1.5\t2\tmet",
                                     "bar\ta partial\t4\t0\tnone",
                                     "bar\tb\t5\t2\tmissed"])
+
+
+@unittest.skipUnless(os.environ.get("PHOTOFX_CHART"), "PHOTOFX_CHART names no chart program")
+class Chart(unittest.TestCase):
+    GREEN, RED, INK = (0x2E, 0x9E, 0x4F), (0xD6, 0x45, 0x2F), (0x20, 0x20, 0x20)
+
+    def draw(self, spec):
+        with tempfile.TemporaryDirectory() as d:
+            spec_path, out = os.path.join(d, "c.chart"), os.path.join(d, "c.png")
+            with open(spec_path, "w") as f:
+                f.write(spec)
+            subprocess.run([os.environ["PHOTOFX_CHART"], spec_path, out], check=True)
+            width, _, bpp, rows = png.read_png(out)
+        return [[tuple(r[x * bpp:x * bpp + 3]) for x in range(width)] for r in rows]
+
+    @staticmethod
+    def columns(image, colour):
+        """Columns where any row shows the colour."""
+        return sorted({x for row in image for x, c in enumerate(row) if c == colour})
+
+    def test_bars_are_coloured_by_verdict_on_a_log_axis_with_the_goal_marked(self):
+        # The axis spans whole decades, 0.1x to 10x: the 1x bar reaches half as far as the 10x
+        # bar, and the goal of 2x lies log10(20) / 2 of the way along.
+        image = self.draw("title\tT\npanel\tP\n"
+                          "bar\ta\t1\t2\tmet\nbar\tb\t10\t2\tmissed\n")
+        bars = image[:-40]  # the legend's swatches sit in the bottom rows
+        green, red = self.columns(bars, self.GREEN), self.columns(bars, self.RED)
+        self.assertTrue(green and red)
+        self.assertEqual(green[0], red[0], "the bars start at the same origin")
+        origin = green[0]
+        half, full = green[-1] - origin, red[-1] - origin
+        self.assertAlmostEqual(half / full, 0.5, delta=0.02)
+        red_rows = [row for row in bars if self.RED in row]
+        ticks = [x for x in range(origin, red[-1]) if all(r[x] == self.INK for r in red_rows)]
+        self.assertTrue(ticks, "no goal mark across the missed bar")
+        self.assertAlmostEqual((ticks[0] - origin) / full, math.log10(20) / 2, delta=0.02)
 
 
 if __name__ == "__main__":
