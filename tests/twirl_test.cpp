@@ -34,7 +34,6 @@ TEST(TwirlTables, SquareRootStepsAreTheRoundedRootsOfTheirLowerEnds) {
   check(SQRT_STEP_2, 480, 4, 128);
   check(SQRT_STEP_3, 768, 8, 2048);
   check(SQRT_STEP_4, 65536, 64, 0);
-  EXPECT_EQ(SQRT_STEP_4[65535], 524284);  // just under rho = 1 (2^19) at the rim
 }
 
 TEST(TwirlTables, SineIsTheRoundedQuarterWave) {
@@ -43,9 +42,7 @@ TEST(TwirlTables, SineIsTheRoundedQuarterWave) {
     ASSERT_GT(std::fabs(exact - std::floor(exact) - 0.5), 1e-6) << k;
     ASSERT_EQ(SIN[k], static_cast<int32_t>(std::llround(exact))) << k;
   }
-  EXPECT_EQ(SIN[0], 0);
-  EXPECT_EQ(SIN[2048], 23170);
-  EXPECT_EQ(SIN[4096], 32768);
+  EXPECT_EQ(SIN[3655], 32301);  // 32300.50003 to 60 digits, the entry closest to a half
 }
 
 struct Warped {
