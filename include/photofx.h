@@ -79,6 +79,120 @@ PHOTOFX_API void fx_control_contrast(const uint32_t* src, const uint8_t* mask, u
                                      int32_t width, int32_t height, int32_t level, int32_t left,
                                      int32_t right, int32_t top, int32_t bottom);
 
+/* ---- Saturation and temperature: level 0..20, 10 neutral ---------------------------------- */
+
+/* Level 0 is grey, 20 about doubles each colour's distance from grey. */
+PHOTOFX_API void controlSaturation(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t level);
+PHOTOFX_API void controlSaturationPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                          int32_t width, int32_t height, int32_t level,
+                                          int32_t left, int32_t right, int32_t top, int32_t bottom);
+/* Above 10 warmer (less blue, more red), below 10 cooler. */
+PHOTOFX_API void controlTemperature(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height, int32_t level);
+PHOTOFX_API void controlTemperaturePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t level,
+                                           int32_t left, int32_t right, int32_t top,
+                                           int32_t bottom);
+
+PHOTOFX_API void fx_control_saturation_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                           int32_t height, int32_t level);
+PHOTOFX_API void fx_control_saturation(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t level, int32_t left,
+                                       int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_control_temperature_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                            int32_t height, int32_t level);
+PHOTOFX_API void fx_control_temperature(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Exposure and hue: level 0..20, 10 neutral; the fx_ functions return a result code ---- */
+
+/* Each channel times level / 10: 0 is black, 20 doubles. */
+PHOTOFX_API void controlExposure(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                 int32_t level);
+/* Valid bounds select masked mode, which edits every pixel of the image whose mask byte is 1. */
+PHOTOFX_API void controlExposurePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+/* Turns the hue by 18 degrees per step from 10. */
+PHOTOFX_API void controlHue(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                            int32_t level);
+PHOTOFX_API void controlHuePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t level, int32_t left,
+                                   int32_t right, int32_t top, int32_t bottom);
+
+PHOTOFX_API int32_t fx_control_exposure_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                            int32_t height, int32_t level);
+PHOTOFX_API int32_t fx_control_exposure(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_control_hue_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                       int32_t height, int32_t level);
+PHOTOFX_API int32_t fx_control_hue(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t level, int32_t left,
+                                   int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Faded colour (level 0..100 percent, others refused) and invert; fx_ return a code ----- */
+
+/* Blends toward a washed-out, warm-tinted copy; 0 unchanged, 100 fully faded. */
+PHOTOFX_API void controlFadedColour(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height, int32_t level);
+PHOTOFX_API void controlFadedColourPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t level,
+                                           int32_t left, int32_t right, int32_t top,
+                                           int32_t bottom);
+/* Each colour channel becomes 255 minus itself. */
+PHOTOFX_API void applyInvert(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyInvertPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                    int32_t width, int32_t height, int32_t left, int32_t right,
+                                    int32_t top, int32_t bottom);
+
+PHOTOFX_API int32_t fx_control_fadedcolor_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                              int32_t height, int32_t level);
+/* Refuses a null mask even when the bounds select the whole image. */
+PHOTOFX_API int32_t fx_control_fadedcolor(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                          int32_t width, int32_t height, int32_t level,
+                                          int32_t left, int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_apply_invert_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                        int32_t height);
+/* Refuses a null mask even when the bounds select the whole image. */
+PHOTOFX_API int32_t fx_apply_invert(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                    int32_t width, int32_t height, int32_t left, int32_t right,
+                                    int32_t top, int32_t bottom);
+
+/* ---- Channel gains (red, green, blue 0..20, 10 neutral) and colour tone -------------------- */
+
+/* A step on one slider adds 6 to its channel and takes 3 from each of the others. */
+PHOTOFX_API void controlAdjustRGB(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                  int32_t red, int32_t green, int32_t blue);
+PHOTOFX_API void AdjustRGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                           int32_t height, int32_t red, int32_t green, int32_t blue, int32_t left,
+                           int32_t right, int32_t top, int32_t bottom);
+
+PHOTOFX_API void fx_adjust_RGB_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t red, int32_t green, int32_t blue);
+PHOTOFX_API void fx_adjust_RGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                               int32_t width, int32_t height, int32_t red, int32_t green,
+                               int32_t blue, int32_t left, int32_t right, int32_t top,
+                               int32_t bottom);
+/* Repaints the image in one hue (0..360 degrees, others refused) at saturation 0.3. */
+PHOTOFX_API int32_t fx_change_colortone(const uint32_t* src, uint32_t* dst, int32_t width,
+                                        int32_t height, int32_t hue);
+
+/* ---- Lighten and darken brushes: edit `image` in place inside a disc around (cx, cy) ------- */
+
+/* Strength 0..255 at the centre, fading to nothing at the radius; the disc becomes opaque. */
+PHOTOFX_API void rubLighten(uint32_t* image, int32_t cx, int32_t cy, int32_t width, int32_t height,
+                            int32_t strength, int32_t radius);
+PHOTOFX_API void rubDarken(uint32_t* image, int32_t cx, int32_t cy, int32_t width, int32_t height,
+                           int32_t strength, int32_t radius);
+
+PHOTOFX_API void fx_apply_lighten(uint32_t* image, int32_t cx, int32_t cy, int32_t width,
+                                  int32_t height, int32_t strength, int32_t radius);
+PHOTOFX_API void fx_apply_darken(uint32_t* image, int32_t cx, int32_t cy, int32_t width,
+                                 int32_t height, int32_t strength, int32_t radius);
+
 /* ---- 16.16 fixed point (65536 = 1.0); range errors are recorded in a per-thread error word - */
 
 PHOTOFX_API int32_t ftofix(double x);  /* nearest, halves away from zero, saturated */
@@ -93,6 +207,121 @@ PHOTOFX_API int32_t fixmul(int32_t a, int32_t b); /* rounded and saturated */
 PHOTOFX_API int32_t fixdiv(int32_t a, int32_t b); /* (a << 16) / b, saturated on b = 0 */
 PHOTOFX_API int32_t idiv(int32_t a, int32_t b);   /* rounded to nearest, halves away from 0 */
 PHOTOFX_API int32_t iidiv(int32_t a, int32_t b);  /* truncated, minus 1 when the signs differ */
+
+/* ---- Fixed-point trigonometry: angles in units of 1/256 turn (0x1000000 is a full turn) ----
+ * Domain errors (acos or asin outside -1.0 ... 1.0, fixatan2(0, 0)) store 33 in the error word
+ * and return 0. */
+
+PHOTOFX_API extern const int32_t _cos_tbl[512];  /* cos(2 pi i / 512) x 65536 */
+PHOTOFX_API extern const int32_t _tan_tbl[256];  /* tan(pi i / 256) x 65536; [128] is -0x7FFFFFFF */
+PHOTOFX_API extern const int32_t _acos_tbl[513]; /* acos(i / 256 - 1) in angle units */
+PHOTOFX_API extern const int32_t fixtorad_r;     /* radians per angle unit, for fixmul */
+PHOTOFX_API extern const int32_t radtofix_r;     /* angle units per radian, for fixmul */
+PHOTOFX_API int32_t fixcos(int32_t angle);       /* nearest entry; any angle wraps */
+PHOTOFX_API int32_t fixsin(int32_t angle);
+PHOTOFX_API int32_t fixtan(int32_t angle); /* -0x7FFFFFFF nearest a quarter turn */
+PHOTOFX_API int32_t fixatan(int32_t x);    /* -64.0 ... 63.5, within half a unit */
+/* Angle of the point (x, y), -128.0 ... 128.0; clears the error word unless x = y = 0. */
+PHOTOFX_API int32_t fixatan2(int32_t y, int32_t x);
+PHOTOFX_API int32_t fixacos(int32_t x); /* 0 ... 128.0 */
+PHOTOFX_API int32_t fixasin(int32_t x); /* -64.0 ... 64.0 */
+
+/* ---- Square root and logarithm; these leave the error word alone ------------------------- */
+
+PHOTOFX_API int32_t isqrt_(int32_t x); /* nearest integer square root; 0 for x <= 0 */
+/* 512 log2(v_i / 1024) at 230 breakpoints v_i from 1024 to 4096. */
+PHOTOFX_API extern const int32_t log_new_FIX[230];
+/* The table interpolated at v (1024 ... 4096 is 1.0 ... 4.0); below 1024 reads as 1024, 4096
+ * and above give 1024, a null table gives 0. */
+PHOTOFX_API int32_t log_interp_FIX(const int32_t* table, int32_t v);
+/* ln(x / 1024) x 2^20 for 5 <= x <= 4194304; 0 for x = 1; 21811200 for any other x. */
+PHOTOFX_API int32_t log_e_FIX_new(int32_t x);
+
+/* ---- Depth-of-field blur and tilt-shift ------------------------------------------------------
+ * Blurs run on a working image: the photograph scaled down by 2^k per side (k from the longer
+ * side: above 420, 850, 1650, 3250 pixels gives 1, 2, 3, 4), 3 bytes per sample (red, green,
+ * blue), with a working depth map of one byte per sample. Previews keep the working copies in
+ * the workspace globals below between an init call and a destroy call; one workspace exists at a
+ * time and each init releases the previous one of either kind. The workspace functions must not
+ * run concurrently. Blur levels run 0..7 (one to eight taps); any other value means the widest
+ * (nine taps). The caller's selection mask is never written. Images whose working copy would be
+ * narrower or lower than 2 samples come back as an unchanged copy of the source. */
+
+PHOTOFX_API extern uint8_t* g_ssrc;     /* working image of the source; null without workspace */
+PHOTOFX_API extern uint8_t* g_sblur;    /* blurred working image, rewritten by every preview */
+PHOTOFX_API extern uint8_t* g_tempd;    /* working depth map; null unless a blur workspace */
+PHOTOFX_API extern int32_t g_scaled_wd; /* working width of the last init */
+PHOTOFX_API extern int32_t g_scaled_ht; /* working height of the last init */
+PHOTOFX_API extern int32_t all; /* 1 when the last fx_Init_blur had empty bounds: blur everything */
+PHOTOFX_API extern int32_t resize_ratio; /* reduction shift k of the last fx_init_tiltshift */
+
+/* Nearest-sample reduction of a width x height image (or mask) to sw x sh samples. */
+PHOTOFX_API void scale_down_img(const uint32_t* src, int32_t width, int32_t height, uint8_t* out,
+                                int32_t sw, int32_t sh);
+PHOTOFX_API void scale_down_depth(const uint8_t* mask, int32_t width, int32_t height,
+                                  uint8_t* depth, int32_t sw, int32_t sh);
+
+/* Builds the blur workspace. Valid bounds blur the pixels whose mask byte is nonzero; empty
+ * bounds (left > right or top > bottom) blur the whole image and need no mask. */
+PHOTOFX_API void fx_Init_blur(const uint32_t* src, const uint8_t* mask, int32_t width,
+                              int32_t height, int32_t left, int32_t right, int32_t top,
+                              int32_t bottom);
+/* Blurs the workspace at `level` and composites it into dst; does nothing without a workspace.
+ * width and height must be those given to fx_Init_blur; dst may be src. */
+PHOTOFX_API void fx_make_blur_preview(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t level);
+/* Releases the blur workspace (and a tilt-shift workspace); harmless when there is none. */
+PHOTOFX_API void fx_destroy_blur(void);
+/* One-shot blur with private working copies; leaves the workspace alone. dst may be src. */
+PHOTOFX_API void fx_make_blur(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                              int32_t width, int32_t height, int32_t level, int32_t left,
+                              int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void applyBlur(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                           int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
+                           int32_t bottom);
+
+/* Separable blur of a working image; taps whose depth byte is not 1 stand in for the centre
+ * sample. dst may be src; on allocation failure dst is left as it was. */
+PHOTOFX_API void make_gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth,
+                                    int32_t width, int32_t height, int32_t level);
+/* Aperture blur of a working image (byte 0 read as blue, byte 2 as red); src and dst distinct. */
+PHOTOFX_API void make_lens_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth,
+                                int32_t width, int32_t height, int32_t level);
+/* Scales a blurred sw x sh working image up into dst through the depth map; pixels with a
+ * nonzero mask byte (every pixel while `all` is 1) are recomputed. dst may be src. */
+PHOTOFX_API void run_blur(const uint32_t* src, const uint8_t* blur, const uint8_t* mask,
+                          const uint8_t* depth, uint32_t* dst, int32_t width, int32_t height,
+                          int32_t sw, int32_t sh);
+
+/* Tilt-shift: rows within half_height of the centre row stay sharp; the blur fades in over half
+ * the distance from the band to the farther image edge. A band that leaves less than two rows
+ * to fade over keeps the whole image sharp. */
+PHOTOFX_API void initTiltShift(const uint32_t* src, int32_t width, int32_t height);
+PHOTOFX_API void makeTiltShift(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t centre, int32_t half_height);
+PHOTOFX_API void applyTiltShift(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                int32_t centre, int32_t half_height);
+PHOTOFX_API void destroyTiltShift(void);
+
+/* Builds the tilt-shift workspace (releasing any workspace of either kind). */
+PHOTOFX_API void fx_init_tiltshift(const uint32_t* src, int32_t width, int32_t height);
+/* Tilt-shift of src into dst from the workspace; does nothing without one. dst may be src. */
+PHOTOFX_API void fx_tiltshift_preview(const uint32_t* src, uint32_t* dst, int32_t width,
+                                      int32_t height, int32_t centre, int32_t half_height);
+/* One-shot tilt-shift with private working copies. dst may be src. */
+PHOTOFX_API void fx_apply_tiltshift(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height, int32_t centre, int32_t half_height);
+/* Releases g_ssrc and g_sblur; a blur workspace's depth map stays until fx_destroy_blur. */
+PHOTOFX_API void fx_destroy_tiltshift(void);
+/* The widest Gaussian blur of a working image, every sample counted. dst may be src. */
+PHOTOFX_API void make_tiltshift(const uint8_t* src, uint8_t* dst, int32_t width, int32_t height);
+/* Scales a blurred working image up and mixes it with src by each row's sharpness. */
+PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t sw, int32_t sh,
+                                   int32_t centre, int32_t half_height);
+/* Widest lens blur of a working image whose luma leans toward each sample's own near the band. */
+PHOTOFX_API void make_tiltshift_lens(const uint8_t* src, uint8_t* dst, int32_t width,
+                                     int32_t height, int32_t centre, int32_t half_height);
 
 /* ---- Warps: bilinear sampling and fast arctangent ------------------------------------------
  * Bilinear weights run 0..2048 (2048 = a whole pixel). Warp angles are degrees with 19 fraction

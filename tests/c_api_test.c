@@ -23,7 +23,8 @@ int main(void) {
   }
 
   if (fx_pack_rgb888(0x12345678u, 0x1AB, 0xCD, 0xEF) != 0x12ABCDEFu || LUT_DELTA[3] != 21845u ||
-      fixmul(0x18000, 0x18000) != 0x24000 || PHOTOFX_INVALID_ARGUMENT != 40962) {
+      fixmul(0x18000, 0x18000) != 0x24000 || PHOTOFX_INVALID_ARGUMENT != 40962 ||
+      _cos_tbl[256] != -65536 || fixatan2(1, -1) != 0x600000 || log_e_FIX_new(2048) != 727040) {
     printf("packing, tables or fixed point differ\n");
     ++failures;
   }

@@ -28,7 +28,7 @@ uint32_t Bilinear_Fixed(uint32_t fx, uint32_t fy, const uint32_t* p00, const uin
   // Weights past a whole pixel would turn 2048 - w negative; hold them to the last neighbour.
   if (fx > pfx::kBilinearOne) fx = pfx::kBilinearOne;
   if (fy > pfx::kBilinearOne) fy = pfx::kBilinearOne;
-  const uint32_t value = pfx::bilinear(fx, fy, *p00, *p10, *p01, *p11);
+  const uint32_t value = pfx::blend_bilinear(fx, fy, *p00, *p10, *p01, *p11);
   if (out != nullptr) *out = value;
   return value;
 }

@@ -22,8 +22,8 @@ constexpr uint32_t kAngle360 = 0xB400000u;
 
 // Blend of four neighbours with weights fx, fy in 0..2048, alpha 255. Each channel sum stays
 // below 2048 * 2048 * 256 = 2^30, so 32 bits hold it exactly.
-constexpr uint32_t bilinear(uint32_t fx, uint32_t fy, uint32_t p00, uint32_t p10, uint32_t p01,
-                            uint32_t p11) {
+constexpr uint32_t blend_bilinear(uint32_t fx, uint32_t fy, uint32_t p00, uint32_t p10,
+                                  uint32_t p01, uint32_t p11) {
   const uint32_t gx = kBilinearOne - fx, gy = kBilinearOne - fy;
   const auto blend = [&](int32_t (*channel)(uint32_t)) {
     const uint32_t top =
@@ -65,14 +65,15 @@ struct SourcePoint {
 
 // The four neighbours of p, each coordinate held to the image, blended. Inside the image the
 // clamp changes nothing, so one rule covers both cases.
-inline uint32_t sample(const uint32_t* src, int32_t width, int32_t height, const SourcePoint& p) {
+inline uint32_t sample_clamped(const uint32_t* src, int32_t width, int32_t height,
+                               const SourcePoint& p) {
   const auto hold = [](int64_t v, int32_t size) {
     return static_cast<size_t>(v < 0 ? 0 : (v > size - 1 ? size - 1 : v));
   };
   const size_t w = static_cast<size_t>(width);
   const size_t xa = hold(p.x, width), xb = hold(p.x + 1, width);
   const size_t ya = hold(p.y, height) * w, yb = hold(p.y + 1, height) * w;
-  return bilinear(p.fx, p.fy, src[ya + xa], src[ya + xb], src[yb + xa], src[yb + xb]);
+  return blend_bilinear(p.fx, p.fy, src[ya + xa], src[ya + xb], src[yb + xa], src[yb + xb]);
 }
 
 // True when the blocks of na and nb words at a and b share any byte.
@@ -114,7 +115,7 @@ void warp_window(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
         ++x;
         continue;
       }
-      const uint32_t value = sample(src, width, height, p);
+      const uint32_t value = sample_clamped(src, width, height, p);
       const size_t i = static_cast<size_t>(x);
       row[i] = value;
       if (!fast) {

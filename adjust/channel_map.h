@@ -1,0 +1,35 @@
+// Per-call lookup for rules that map red, green and blue each on its own: the rule is evaluated
+// once for each of the 256 values of each channel, and the pixel loop is three loads and an or.
+// Exact by construction, since the table holds the rule's own results.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/pixel.h"
+
+namespace pfx {
+
+struct ChannelMap {
+  // Results already shifted into their place in the pixel word.
+  uint32_t red[256], green[256], blue[256];
+
+  // fr, fg, fb: int32_t(int32_t c) giving the new channel, 0..255, for a source channel c.
+  template <class Fr, class Fg, class Fb>
+  ChannelMap(Fr&& fr, Fg&& fg, Fb&& fb) : red{}, green{}, blue{} {
+    for (int32_t c = 0; c < 256; ++c) {
+      red[c] = (static_cast<uint32_t>(fr(c)) & 0xFFu) << 16;
+      green[c] = (static_cast<uint32_t>(fg(c)) & 0xFFu) << 8;
+      blue[c] = static_cast<uint32_t>(fb(c)) & 0xFFu;
+    }
+  }
+
+  // The same curve on all three channels.
+  template <class F>
+  explicit ChannelMap(F&& f) : ChannelMap(f, f, f) {}
+
+  uint32_t operator()(uint32_t p) const {
+    return alpha_bits(p) | red[(p >> 16) & 0xFFu] | green[(p >> 8) & 0xFFu] | blue[p & 0xFFu];
+  }
+};
+
+}  // namespace pfx
