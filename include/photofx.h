@@ -323,6 +323,30 @@ PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uin
 PHOTOFX_API void make_tiltshift_lens(const uint8_t* src, uint8_t* dst, int32_t width,
                                      int32_t height, int32_t centre, int32_t half_height);
 
+/* ---- Auto adjust: tone mapping from the image's lightness histogram --------------------------
+ * Images under 150 pixels in either direction get contrast level 12 instead. The four
+ * parameters are read at the start of each call; fx_set_hdr must not run during one. A value
+ * stored into a parameter directly, outside its range, counts as the nearer end of the range. */
+
+PHOTOFX_API extern int32_t g_HDR_Threshold; /* 0..127, initially 70: bright share (percent) that
+                                                selects weight 2 */
+PHOTOFX_API extern int32_t g_HDR_CutOff;    /* 0..100, initially 100: top of the tone curve */
+PHOTOFX_API extern int32_t g_HDR_Weight1;   /* 300..8196, initially 1000: uniform weight */
+PHOTOFX_API extern int32_t g_HDR_Weight2;   /* 300..8196, initially 5120: the same, bright image */
+
+/* PHOTOFX_SUCCESS; PHOTOFX_OUT_OF_MEMORY with dst untouched; PHOTOFX_INVALID_ARGUMENT for a null
+ * buffer or an image too large to address. dst may be src. */
+PHOTOFX_API int32_t fx_process_hdr(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API int32_t applyAutoAdjust(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+/* Stores each value that lies in its parameter's range; the others are ignored. */
+PHOTOFX_API void fx_set_hdr(int32_t threshold, int32_t cutoff, int32_t weight1, int32_t weight2);
+PHOTOFX_API int32_t fx_get_threshold_hdr(void);
+PHOTOFX_API int32_t fx_get_cutoff_hdr(void);
+PHOTOFX_API int32_t fx_get_weight1_hdr(void);
+PHOTOFX_API int32_t fx_get_weight2_hdr(void);
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif
