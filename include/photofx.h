@@ -323,6 +323,70 @@ PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uin
 PHOTOFX_API void make_tiltshift_lens(const uint8_t* src, uint8_t* dst, int32_t width,
                                      int32_t height, int32_t centre, int32_t half_height);
 
+/* ---- Preset looks: fixed chains of the slider adjustments -----------------------------------
+ * The partial variants run the full look into a scratch image and, inside the bounds (clipped to
+ * the image), copy the look's pixel where the mask byte is 1 and the source pixel elsewhere;
+ * pixels outside the bounds are not written. Empty bounds (left > right or top > bottom) write
+ * the whole look without reading the mask. Nothing is written when the scratch image cannot be
+ * allocated. dst may be src. Downlight runs auto adjust as its second pass and so follows the
+ * auto-adjust parameters below. */
+
+PHOTOFX_API void applyRetro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyRetroPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t left, int32_t right,
+                                   int32_t top, int32_t bottom);
+PHOTOFX_API void applySunshine(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applySunshinePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+PHOTOFX_API void applyDownlight(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyDownlightPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t left, int32_t right,
+                                       int32_t top, int32_t bottom);
+PHOTOFX_API void applyBluewash(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyBluewashPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+PHOTOFX_API void applyNostalgia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyNostalgiaPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t left, int32_t right,
+                                       int32_t top, int32_t bottom);
+PHOTOFX_API void applyYellowglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyYellowglowPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t left, int32_t right,
+                                        int32_t top, int32_t bottom);
+
+PHOTOFX_API void fx_apply_retro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void fx_apply_retro_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t left, int32_t right,
+                                        int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_sunshine(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API void fx_apply_sunshine_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_downlight(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+PHOTOFX_API void fx_apply_downlight_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                            int32_t width, int32_t height, int32_t left,
+                                            int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_bluewash(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API void fx_apply_bluewash_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_nostalgia(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+PHOTOFX_API void fx_apply_nostalgia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                            int32_t width, int32_t height, int32_t left,
+                                            int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_yellowglow(const uint32_t* src, uint32_t* dst, int32_t width,
+                                     int32_t height);
+PHOTOFX_API void fx_apply_yellowglow_partial(const uint32_t* src, const uint8_t* mask,
+                                             uint32_t* dst, int32_t width, int32_t height,
+                                             int32_t left, int32_t right, int32_t top,
+                                             int32_t bottom);
+
 /* ---- Auto adjust: tone mapping from the image's lightness histogram --------------------------
  * Images under 150 pixels in either direction get contrast level 12 instead. The four
  * parameters are read at the start of each call; fx_set_hdr must not run during one. A value
