@@ -323,6 +323,65 @@ PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uin
 PHOTOFX_API void make_tiltshift_lens(const uint8_t* src, uint8_t* dst, int32_t width,
                                      int32_t height, int32_t centre, int32_t half_height);
 
+/* ---- Sharpen: each channel pushed away from the mean of its left and right neighbours ----- */
+
+/* Sharpens the whole image; dst may be src. Writes nothing if its scratch image is refused. */
+PHOTOFX_API void fx_apply_sharpen_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                      int32_t height);
+/* Sharpens the pixels whose mask byte is 1 (valid bounds only choose that mode, they do not
+ * limit it) or every pixel (empty bounds); level is ignored; the mask is never written. */
+PHOTOFX_API void fx_apply_sharpen(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                  int32_t width, int32_t height, int32_t level, int32_t left,
+                                  int32_t right, int32_t top, int32_t bottom);
+/* Entry point of fx_apply_sharpen. */
+PHOTOFX_API void applySharpen(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                              int32_t width, int32_t height, int32_t level, int32_t left,
+                              int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Pixelize and red-eye: blocks of 2^shift pixels anchored at the origin, shift 0..31 --- */
+
+/* Every pixel takes the top-left pixel of its block; dst may be src. Other shifts: no-op. */
+PHOTOFX_API void applyPixelize(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t shift);
+/* Pixelizes img in place inside the closed disc of the given centre and radius. */
+PHOTOFX_API void rubPixelize(uint32_t* img, int32_t width, int32_t height, int32_t shift,
+                             int32_t cx, int32_t cy, int32_t radius);
+/* Darkens, in place, the red of pixels with 2 x red > 5 x green in the square cx, cy +- radius. */
+PHOTOFX_API void removeRedeye(uint32_t* img, int32_t width, int32_t height, int32_t cx, int32_t cy,
+                              int32_t radius);
+/* The implementations the three entry points above forward to. */
+PHOTOFX_API void fx_apply_pixelize(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height, int32_t shift);
+PHOTOFX_API void fx_rub_pixelize(uint32_t* img, int32_t width, int32_t height, int32_t shift,
+                                 int32_t cx, int32_t cy, int32_t radius);
+PHOTOFX_API void fx_remove_redeye(uint32_t* img, int32_t width, int32_t height, int32_t cx,
+                                  int32_t cy, int32_t radius);
+
+/* ---- Greyscale: mean of the channels times a gain, level 10 = the mean itself, 0..20 ------ */
+
+/* Full and partial entry points; they forward to fx_control_greyscale_all and _greyscale. */
+PHOTOFX_API void controlGreyscale(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                  int32_t level);
+PHOTOFX_API void controlGreyscalePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                         int32_t width, int32_t height, int32_t level, int32_t left,
+                                         int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_control_greyscale_all(const uint32_t* src, uint32_t* dst, int32_t width,
+                                          int32_t height, int32_t level);
+PHOTOFX_API void fx_control_greyscale(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t level, int32_t left,
+                                      int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Sepia: red lifted and blue lowered by two fixed curves; returns a result code -------- */
+
+/* Full variant (dst may be src) and partial variant; null src or dst: invalid argument. */
+PHOTOFX_API int32_t fx_apply_sepia(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API int32_t fx_apply_sepia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_get_sepia_r(int32_t value); /* red curve; values outside 0..255 as given */
+PHOTOFX_API int32_t fx_get_sepia_b(int32_t value); /* blue curve; values outside 0..255 as given */
+
 /* ---- Preset looks: fixed chains of the slider adjustments -----------------------------------
  * The partial variants run the full look into a scratch image and, inside the bounds (clipped to
  * the image), copy the look's pixel where the mask byte is 1 and the source pixel elsewhere;
