@@ -458,6 +458,94 @@ PHOTOFX_API void runTwirl(const uint32_t* src, uint32_t* dst, int32_t width, int
                           int32_t cx, int32_t cy, int32_t radius, int32_t angle, int32_t left,
                           int32_t right, int32_t top, int32_t bottom, uint32_t fast);
 
+/* ---- Preset looks: fixed chains of the slider adjustments -----------------------------------
+ * The partial variants run the full look into a scratch image and, inside the bounds (clipped to
+ * the image), copy the look's pixel where the mask byte is 1 and the source pixel elsewhere;
+ * pixels outside the bounds are not written. Empty bounds (left > right or top > bottom) write
+ * the whole look without reading the mask. Nothing is written when the scratch image cannot be
+ * allocated. dst may be src. Downlight runs auto adjust as its second pass and so follows the
+ * auto-adjust parameters below. */
+
+PHOTOFX_API void applyRetro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyRetroPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t left, int32_t right,
+                                   int32_t top, int32_t bottom);
+PHOTOFX_API void applySunshine(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applySunshinePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+PHOTOFX_API void applyDownlight(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyDownlightPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t left, int32_t right,
+                                       int32_t top, int32_t bottom);
+PHOTOFX_API void applyBluewash(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyBluewashPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+PHOTOFX_API void applyNostalgia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyNostalgiaPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t left, int32_t right,
+                                       int32_t top, int32_t bottom);
+PHOTOFX_API void applyYellowglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyYellowglowPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t left, int32_t right,
+                                        int32_t top, int32_t bottom);
+
+PHOTOFX_API void fx_apply_retro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void fx_apply_retro_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t left, int32_t right,
+                                        int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_sunshine(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API void fx_apply_sunshine_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_downlight(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+PHOTOFX_API void fx_apply_downlight_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                            int32_t width, int32_t height, int32_t left,
+                                            int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_bluewash(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API void fx_apply_bluewash_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_nostalgia(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+PHOTOFX_API void fx_apply_nostalgia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                            int32_t width, int32_t height, int32_t left,
+                                            int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_yellowglow(const uint32_t* src, uint32_t* dst, int32_t width,
+                                     int32_t height);
+PHOTOFX_API void fx_apply_yellowglow_partial(const uint32_t* src, const uint8_t* mask,
+                                             uint32_t* dst, int32_t width, int32_t height,
+                                             int32_t left, int32_t right, int32_t top,
+                                             int32_t bottom);
+
+/* ---- Auto adjust: tone mapping from the image's lightness histogram --------------------------
+ * Images under 150 pixels in either direction get contrast level 12 instead. The four
+ * parameters are read at the start of each call; fx_set_hdr must not run during one. A value
+ * stored into a parameter directly, outside its range, counts as the nearer end of the range. */
+
+PHOTOFX_API extern int32_t g_HDR_Threshold; /* 0..127, initially 70: bright share (percent) that
+                                                selects weight 2 */
+PHOTOFX_API extern int32_t g_HDR_CutOff;    /* 0..100, initially 100: top of the tone curve */
+PHOTOFX_API extern int32_t g_HDR_Weight1;   /* 300..8196, initially 1000: uniform weight */
+PHOTOFX_API extern int32_t g_HDR_Weight2;   /* 300..8196, initially 5120: the same, bright image */
+
+/* PHOTOFX_SUCCESS; PHOTOFX_OUT_OF_MEMORY with dst untouched; PHOTOFX_INVALID_ARGUMENT for a null
+ * buffer or an image too large to address. dst may be src. */
+PHOTOFX_API int32_t fx_process_hdr(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API int32_t applyAutoAdjust(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+/* Stores each value that lies in its parameter's range; the others are ignored. */
+PHOTOFX_API void fx_set_hdr(int32_t threshold, int32_t cutoff, int32_t weight1, int32_t weight2);
+PHOTOFX_API int32_t fx_get_threshold_hdr(void);
+PHOTOFX_API int32_t fx_get_cutoff_hdr(void);
+PHOTOFX_API int32_t fx_get_weight1_hdr(void);
+PHOTOFX_API int32_t fx_get_weight2_hdr(void);
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif
