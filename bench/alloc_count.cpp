@@ -1,14 +1,15 @@
 // Replacements for malloc and its relatives that forward to the C library's own allocator and,
-// while counting is on, add up the bytes of live blocks (by malloc_usable_size, so blocks freed
-// later are subtracted exactly). Only the benchmark program contains them; the library and its
-// production path are untouched.
+// while counting is on, add up the bytes the caller asked for. Each block allocated while counting
+// is remembered with its size in a fixed table (the counter must not allocate), so its release is
+// subtracted exactly; blocks from before are left out, so releasing an older workspace does not
+// hide the call's own allocations. Only the benchmark program contains these; the library and
+// its production path are untouched.
 #include "bench/alloc_count.h"
-
-#include <malloc.h>
 
 #include <atomic>
 #include <cerrno>
 #include <cstddef>
+#include <cstring>
 
 extern "C" {
 void* __libc_malloc(size_t size);
@@ -21,35 +22,81 @@ void __libc_free(void* ptr);
 namespace fxbench {
 namespace {
 
-std::atomic<bool> g_counting{false};
-std::atomic<int64_t> g_live{0};
-std::atomic<int64_t> g_peak{0};
+// Open addressing with linear probing; a released slot keeps a tombstone so that later probes
+// walk past it. Far more slots than any call holds blocks at once.
+constexpr size_t kSlots = size_t{1} << 16;
+constexpr uintptr_t kEmpty = 0;
+constexpr uintptr_t kTombstone = 1;
 
-void note_alloc(void* p) {
-  if (p == nullptr || !g_counting.load(std::memory_order_relaxed)) return;
-  const int64_t size = static_cast<int64_t>(malloc_usable_size(p));
-  const int64_t now = g_live.fetch_add(size) + size;
-  int64_t peak = g_peak.load();
-  while (now > peak && !g_peak.compare_exchange_weak(peak, now)) {
+struct Slot {
+  uintptr_t ptr;
+  size_t size;
+};
+
+Slot g_table[kSlots];
+std::atomic<bool> g_counting{false};
+std::atomic_flag g_lock = ATOMIC_FLAG_INIT;
+int64_t g_live = 0;
+int64_t g_peak = 0;
+bool g_overflow = false;
+
+struct Lock {
+  Lock() {
+    while (g_lock.test_and_set(std::memory_order_acquire)) {
+    }
   }
+  ~Lock() { g_lock.clear(std::memory_order_release); }
+};
+
+size_t home(uintptr_t p) {
+  return static_cast<size_t>((static_cast<uint64_t>(p) >> 4) * 0x9E3779B97F4A7C15ull >> 48) &
+         (kSlots - 1);
 }
 
-void note_free(void* p) {
+void remember(void* p, size_t size) {
   if (p == nullptr || !g_counting.load(std::memory_order_relaxed)) return;
-  g_live.fetch_sub(static_cast<int64_t>(malloc_usable_size(p)));
+  Lock lock;
+  const auto key = reinterpret_cast<uintptr_t>(p);
+  for (size_t i = home(key), n = 0; n < kSlots; i = (i + 1) & (kSlots - 1), ++n) {
+    if (g_table[i].ptr == kEmpty || g_table[i].ptr == kTombstone) {
+      g_table[i] = {key, size};
+      g_live += static_cast<int64_t>(size);
+      if (g_live > g_peak) g_peak = g_live;
+      return;
+    }
+  }
+  g_overflow = true;
+}
+
+void forget(void* p) {
+  if (p == nullptr || !g_counting.load(std::memory_order_relaxed)) return;
+  Lock lock;
+  const auto key = reinterpret_cast<uintptr_t>(p);
+  for (size_t i = home(key), n = 0; n < kSlots; i = (i + 1) & (kSlots - 1), ++n) {
+    if (g_table[i].ptr == kEmpty) return;  // allocated before counting began
+    if (g_table[i].ptr == key) {
+      g_live -= static_cast<int64_t>(g_table[i].size);
+      g_table[i].ptr = kTombstone;
+      return;
+    }
+  }
 }
 
 }  // namespace
 
 void start_counting() {
+  Lock lock;
+  std::memset(g_table, 0, sizeof g_table);
   g_live = 0;
   g_peak = 0;
+  g_overflow = false;
   g_counting = true;
 }
 
 Usage stop_counting() {
   g_counting = false;
-  return {g_peak.load(), g_live.load()};
+  Lock lock;
+  return {g_peak, g_live, g_overflow};
 }
 
 }  // namespace fxbench
@@ -58,36 +105,35 @@ extern "C" {
 
 void* malloc(size_t size) noexcept {
   void* p = __libc_malloc(size);
-  fxbench::note_alloc(p);
+  fxbench::remember(p, size);
   return p;
 }
 
 void* calloc(size_t count, size_t size) noexcept {
   void* p = __libc_calloc(count, size);
-  fxbench::note_alloc(p);
+  // calloc has refused a product that overflows, so it is exact here.
+  if (p != nullptr) fxbench::remember(p, count * size);
   return p;
 }
 
 void* realloc(void* ptr, size_t size) noexcept {
-  // The old block's size must be read before the C library may release it.
-  const bool counting = fxbench::g_counting.load(std::memory_order_relaxed);
-  const int64_t old = (counting && ptr != nullptr) ? int64_t(malloc_usable_size(ptr)) : 0;
   void* p = __libc_realloc(ptr, size);
-  if (counting && (p != nullptr || size == 0)) {
-    fxbench::g_live.fetch_sub(old);
-    fxbench::note_alloc(p);
+  // A failed realloc keeps the old block; realloc(ptr, 0) releases it.
+  if (p != nullptr || size == 0) {
+    fxbench::forget(ptr);
+    fxbench::remember(p, size);
   }
   return p;
 }
 
 void free(void* ptr) noexcept {
-  fxbench::note_free(ptr);
+  fxbench::forget(ptr);
   __libc_free(ptr);
 }
 
 void* memalign(size_t alignment, size_t size) noexcept {
   void* p = __libc_memalign(alignment, size);
-  fxbench::note_alloc(p);
+  fxbench::remember(p, size);
   return p;
 }
 

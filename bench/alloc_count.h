@@ -2,6 +2,7 @@
 // replaces the C allocator's entry points (alloc_count.cpp) with thin wrappers around the C
 // library's own, and the library's fx_ wrappers reach them like any other caller. Counting is off
 // except between start_counting and stop_counting; off, a wrapper costs one load and a branch.
+// Bytes are those requested, not the allocator's rounded block sizes.
 #pragma once
 
 #include <cstdint>
@@ -9,8 +10,9 @@
 namespace fxbench {
 
 struct Usage {
-  int64_t peak = 0;  // most bytes held at once above what was held at the start
-  int64_t kept = 0;  // bytes still held at the end (a workspace), less any released
+  int64_t peak = 0;       // most bytes held at once in blocks allocated while counting
+  int64_t kept = 0;       // bytes of those blocks still held at the end (a workspace)
+  bool overflow = false;  // more blocks than the counter can follow: the figures are short
 };
 
 void start_counting();

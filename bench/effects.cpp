@@ -4,27 +4,21 @@
 //
 //   {.name = "soft-glow", .goal = kHsvGoal, .peer = Peer::kHsv,
 //    .full = full<applySoftglow, 60>, .partial = partial<applySoftglowPartial, 60>},
-//   {.name = "retro", .goal = kPresetGoal, .full = full<applyRetro>,
-//    .partial = partial<applyRetroPartial>},
 //   {.name = "gamma", .goal = kPointGoal, .peer = Peer::kLut,
 //    .full = full<control_gamma, 0, 0.77>},
-//   {.name = "auto-adjust", .goal = kAutoGoal, .full = full<applyAutoAdjust>},
+//   {.name = "pop-art-preview", .goal = kHsvGoal, .peer = Peer::kHsv,
+//    .full = full<fx_apply_popart_prev>},
 //
 // full<F, levels...> calls F(src, dst, width, height, levels...); partial<F, levels...> calls
 // F(src, mask, dst, width, height, levels..., left, right, top, bottom), with the ellipse's box
-// as bounds. Any other shape is a small function over the Frame (see the blur and the brushes
-// below), e.g. a twirl over the whole picture, held to kWarpGoal against Peer::kRemap:
-//
-//   void twirl(const Frame& f) {
-//     runTwirl(f.src, f.dst, f.width, f.height, f.width / 2, f.height / 2,
-//              std::min(f.width, f.height) / 2, 90, 0, f.width - 1, 0, f.height - 1, 0);
-//   }
-//   {.name = "twirl", .goal = kWarpGoal, .peer = Peer::kRemap, .full = twirl},
+// as bounds. Any other shape is a small function over the Frame: see the blur, the warps and
+// the brushes below.
 //
 // Pick levels that change the image: the suite refuses a call that leaves its output equal to the
 // photograph (a refused argument would otherwise time as a fast no-op); set .changes = false only
 // where the picture may legitimately come back unchanged. `goal` is the goal for the
 // effect's kind (suite.h), `peer` the OpenCV work nearest to it.
+#include <cmath>
 #include <cstdint>
 
 #include "bench/suite.h"
@@ -122,6 +116,32 @@ void red_eye(const Frame& f) {
   removeRedeye(f.dst, f.width, f.height, f.width / 3, f.height / 3, eye_radius(f));
 }
 
+// ---- Warps over the whole picture --------------------------------------------------------
+
+// Half the diagonal: a circle this wide around the centre reaches every corner.
+int32_t half_diagonal(const Frame& f) {
+  return static_cast<int32_t>(std::ceil(std::hypot(f.width, f.height) / 2));
+}
+
+void twirl(const Frame& f, uint32_t fast) {
+  runTwirl(f.src, f.dst, f.width, f.height, f.width / 2, f.height / 2, half_diagonal(f), 90, 0,
+           f.width - 1, 0, f.height - 1, fast);
+}
+
+// The sphericity's circle is about 1.4 times its radius.
+void sphericity(const Frame& f, uint32_t fast) {
+  runSphericity(f.src, f.dst, f.width, f.height, f.width / 2, f.height / 2,
+                half_diagonal(f) * 5 / 7 + 1, 50, 0, f.width - 1, 0, f.height - 1, fast);
+}
+
+// Mirrors about the middle, so that the output has the source's size and fits dst.
+void mirror(const Frame& f, int32_t mode, int32_t axis) {
+  const int32_t pos = (axis == MIRROR_HORIZONTAL ? f.width : f.height) / 2 - 1;
+  const int32_t w = getMirrorOutwidth(f.width, pos, mode, axis);
+  const int32_t h = getMirrorOutheight(f.height, pos, mode, axis);
+  if (w == f.width && h == f.height) runMirror(f.src, w, h, f.dst, w, h, pos, mode, axis);
+}
+
 // clang-format off
 constexpr Effect kEffects[] = {
     // ---- Point operations ------------------------------------------------------------------
@@ -151,6 +171,20 @@ constexpr Effect kEffects[] = {
      .full = full<controlHue, 14>, .partial = partial<controlHuePartial, 14>},
     {.name = "colour-tone", .goal = kHsvGoal, .peer = Peer::kHsv,
      .full = full<fx_change_colortone, 30>},
+
+    // ---- Preset looks (downlight runs auto adjust inside, so it has no chain goal) and auto adjust
+    {.name = "retro", .goal = kPresetGoal, .full = full<applyRetro>,
+     .partial = partial<applyRetroPartial>},
+    {.name = "sunshine", .goal = kPresetGoal, .full = full<applySunshine>,
+     .partial = partial<applySunshinePartial>},
+    {.name = "bluewash", .goal = kPresetGoal, .full = full<applyBluewash>,
+     .partial = partial<applyBluewashPartial>},
+    {.name = "nostalgia", .goal = kPresetGoal, .full = full<applyNostalgia>,
+     .partial = partial<applyNostalgiaPartial>},
+    {.name = "yellowglow", .goal = kPresetGoal, .full = full<applyYellowglow>,
+     .partial = partial<applyYellowglowPartial>},
+    {.name = "downlight", .full = full<applyDownlight>, .partial = partial<applyDownlightPartial>},
+    {.name = "auto-adjust", .goal = kAutoGoal, .full = full<applyAutoAdjust>},
 
     // ---- Neighbourhood effects -------------------------------------------------------------
     {.name = "sharpen", .full = full<fx_apply_sharpen_all>, .partial = partial<applySharpen, 0>},
@@ -183,6 +217,19 @@ constexpr Effect kEffects[] = {
     {.name = "tilt-shift-composite", .peer = Peer::kResize, .full = tilt_composite,
      .setup = init_blurred, .teardown = fx_destroy_blur},
     {.name = "tilt-shift", .full = tilt_oneshot},
+
+    // ---- Warps ---------------------------------------------------------------------------------
+    {.name = "twirl", .goal = kWarpGoal, .peer = Peer::kRemap,
+     .full = [](const Frame& f) { twirl(f, 0); }},
+    {.name = "twirl-fast", .peer = Peer::kRemap, .full = [](const Frame& f) { twirl(f, 1); }},
+    {.name = "sphericity", .goal = kWarpGoal, .peer = Peer::kRemap,
+     .full = [](const Frame& f) { sphericity(f, 0); }},
+    {.name = "sphericity-fast", .peer = Peer::kRemap,
+     .full = [](const Frame& f) { sphericity(f, 1); }},
+    {.name = "mirror-horizontal",
+     .full = [](const Frame& f) { mirror(f, MIRROR_KEEP_LEFT, MIRROR_HORIZONTAL); }},
+    {.name = "mirror-vertical",
+     .full = [](const Frame& f) { mirror(f, MIRROR_KEEP_TOP, MIRROR_VERTICAL); }},
 
     // ---- Brushes: one stroke each ----------------------------------------------------------
     {.name = "lighten-brush", .full = lighten, .items = brush_area, .in_place = true},

@@ -88,13 +88,13 @@ void resize_teardown() {
   drop_state();
 }
 
-// A twirl over the inscribed circle: 90 degrees at the centre, fading to none at the rim. The
+// A twirl like the suite's: 90 degrees at the centre, fading to none at half the diagonal. The
 // map is kept between runs of the same size: it takes longer to build than to use.
 void remap_setup(const Frame& f) {
   if (g_map.rows == f.height && g_map.cols == f.width) return;
   g_map.create(f.height, f.width, CV_32FC2);
   const double cx = f.width / 2.0, cy = f.height / 2.0;
-  const double radius = (f.width < f.height ? f.width : f.height) / 2.0;
+  const double radius = std::hypot(f.width, f.height) / 2;
   for (int32_t y = 0; y < f.height; ++y) {
     cv::Vec2f* row = g_map.ptr<cv::Vec2f>(y);
     for (int32_t x = 0; x < f.width; ++x) {
