@@ -89,6 +89,13 @@ class Goals(unittest.TestCase):
         self.assertAlmostEqual(rows["fat/full/12mp"].bytes_per_px, 9.0)
         self.assertIs(rows["fat/full/12mp"].met, False)
 
+    def test_summary_says_which_part_of_a_two_part_goal_fails(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("slow/full/12mp", 50, "goal=memcpy*4 scratch<=8", peak=8 * 12e6)])
+        self.assertIs(rows["slow/full/12mp"].met, False)
+        self.assertIn("(goal ≤ 4× memcpy: not met; scratch ≤ 8 B/px: met)",
+                      report.summary(list(rows.values())))
+
     def test_goal_without_its_peer_is_not_judged(self):
         rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
                         bench("hue/full/12mp", 5, "goal=peer*1 peer=cv-hsv")])
@@ -127,6 +134,22 @@ class Results(unittest.TestCase):
             self.assertEqual(e.exception.code, 1)
             with open(os.path.join(d, "performance.md")) as f:
                 self.assertIn("failed: the call wrote nothing", f.read())
+
+    def test_report_from_a_saved_run_keeps_the_suite_order(self):
+        # Interleaved repetitions are written in random order; the report follows registration.
+        entries = [bench("b/full/12mp", 15, ""), bench("floor/memcpy/12mp", 10, "reference"),
+                   bench("a/full/12mp", 15, "")]
+        for e, family in zip(entries, (2, 0, 1)):
+            e["family_index"] = family
+        with tempfile.TemporaryDirectory() as d:
+            path = os.path.join(d, "r.json")
+            with open(path, "w") as f:
+                json.dump({"benchmarks": entries}, f)
+            report.main(["--from-json", path, "--out", d, "--chart", "/bin/true"])
+            with open(os.path.join(d, "performance.md")) as f:
+                text = f.read()
+        self.assertLess(text.index("**memcpy**"), text.index("| a |"))
+        self.assertLess(text.index("| a |"), text.index("| b |"))
 
     def test_chart_gets_one_bar_per_row_coloured_by_its_goal(self):
         rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
