@@ -479,6 +479,170 @@ PHOTOFX_API int32_t fx_softglow_partial(const uint32_t* src, const uint8_t* mask
                                         int32_t width, int32_t height, int32_t level, int32_t left,
                                         int32_t right, int32_t top, int32_t bottom);
 
+/* ---- Warps: bilinear sampling and fast arctangent ------------------------------------------
+ * Bilinear weights run 0..2048 (2048 = a whole pixel). Warp angles are degrees with 19 fraction
+ * bits: 0x2D00000 is 90 degrees, 0xB400000 a full turn. */
+
+/* atan(i / 2048) in warp-angle units, rounded to nearest. */
+PHOTOFX_API extern const int32_t ATAN[2048];
+/* Blends four neighbours with weights fx, fy (held to 0..2048); alpha 255. Stores the result in
+ * *out (unless out is null) and returns it; returns 0 and stores nothing if a pixel is null. */
+PHOTOFX_API uint32_t Bilinear_Fixed(uint32_t fx, uint32_t fy, const uint32_t* p00,
+                                    const uint32_t* p10, const uint32_t* p01, const uint32_t* p11,
+                                    uint32_t* out);
+/* Angle of the vector (b along 0 degrees, a along 90 degrees), 0 <= result < 0xB400000;
+ * INT32_MIN counts as magnitude 2^31. */
+PHOTOFX_API uint32_t FATAN2(int32_t a, int32_t b);
+
+/* ---- Mirror: keep one side of a row or column and append its reflection --------------------
+ * Ask for the output size with the getters, allocate it, then run the mirror. */
+
+#define MIRROR_VERTICAL 57345    /* 0xE001: reflect across a row; the height changes */
+#define MIRROR_HORIZONTAL 57346  /* 0xE002: reflect across a column; the width changes */
+#define MIRROR_KEEP_LEFT 57347   /* horizontal: keep columns 0..pos, reflect them rightward */
+#define MIRROR_KEEP_RIGHT 57348  /* horizontal: keep columns pos..width-1, reflect them leftward */
+#define MIRROR_KEEP_TOP 57349    /* vertical: keep rows 0..pos, reflect them downward */
+#define MIRROR_KEEP_BOTTOM 57350 /* vertical: keep rows pos..height-1, reflect them upward */
+
+/* Output width; the width unchanged when pos, mode or axis does not mirror it (or the mirrored
+ * width would not fit in 32 bits). */
+PHOTOFX_API int32_t fx_get_mirror_out_width(int32_t width, int32_t pos, int32_t mode, int32_t axis);
+/* Output height, by the same rules. */
+PHOTOFX_API int32_t fx_get_mirror_out_height(int32_t height, int32_t pos, int32_t mode,
+                                             int32_t axis);
+/* PHOTOFX_INVALID_ARGUMENT (dst untouched) unless pos lies inside the mirrored side, mode fits
+ * axis, dst_width and dst_height are the getters' values and the buffers do not overlap. */
+PHOTOFX_API int32_t fx_mirror(const uint32_t* src, int32_t src_width, int32_t src_height,
+                              uint32_t* dst, int32_t dst_width, int32_t dst_height, int32_t pos,
+                              int32_t mode, int32_t axis);
+PHOTOFX_API int32_t getMirrorOutwidth(int32_t width, int32_t pos, int32_t mode, int32_t axis);
+PHOTOFX_API int32_t getMirrorOutheight(int32_t height, int32_t pos, int32_t mode, int32_t axis);
+PHOTOFX_API int32_t runMirror(const uint32_t* src, int32_t src_width, int32_t src_height,
+                              uint32_t* dst, int32_t dst_width, int32_t dst_height, int32_t pos,
+                              int32_t mode, int32_t axis);
+
+/* ---- Sphericity and twirl --------------------------------------------------------------------
+ * Both copy src to dst and warp the pixels of the window (left..right, top..bottom, clipped to
+ * the image) that fall inside their circle around (cx, cy); warped pixels get alpha 255. A
+ * non-zero `fast` computes every second pixel and fills 2 x 2 blocks, never beyond the window.
+ * They return PHOTOFX_INVALID_ARGUMENT, writing nothing, for a null or overlapping buffer, a
+ * centre outside the image or a radius, level or angle out of range. */
+
+/* Falloff of the sphericity with the squared distance, 26 fraction bits; index 256 reads as 0. */
+PHOTOFX_API extern const int32_t EXP_n7[256];
+/* Bulges (level 1..100) or pinches (level -100..-1) a circle of about 1.4 x radius. */
+PHOTOFX_API int32_t fx_sphericity(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                  int32_t cx, int32_t cy, int32_t radius, int32_t level,
+                                  int32_t left, int32_t right, int32_t top, int32_t bottom,
+                                  uint32_t fast);
+PHOTOFX_API void runSphericity(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t cx, int32_t cy, int32_t radius, int32_t level, int32_t left,
+                               int32_t right, int32_t top, int32_t bottom, uint32_t fast);
+
+/* 256 x sqrt(u), rounded, for the normalised squared distance u in steps of 1, 4, 8 and 64. */
+PHOTOFX_API extern const int32_t SQRT_STEP_1[128];   /* u = j */
+PHOTOFX_API extern const int32_t SQRT_STEP_2[480];   /* u = 4 (j + 32) */
+PHOTOFX_API extern const int32_t SQRT_STEP_3[768];   /* u = 8 (j + 256) */
+PHOTOFX_API extern const int32_t SQRT_STEP_4[65536]; /* u = 64 j */
+/* 32768 x sin(2 pi k / 16384), rounded: a quarter wave. */
+PHOTOFX_API extern const int32_t SIN[4097];
+/* Turns the circle of `radius` by `angle` degrees (-360..360) at the centre, falling to 0 at
+ * the rim. */
+PHOTOFX_API int32_t fx_twirl(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                             int32_t cx, int32_t cy, int32_t radius, int32_t angle, int32_t left,
+                             int32_t right, int32_t top, int32_t bottom, uint32_t fast);
+PHOTOFX_API void runTwirl(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                          int32_t cx, int32_t cy, int32_t radius, int32_t angle, int32_t left,
+                          int32_t right, int32_t top, int32_t bottom, uint32_t fast);
+
+/* ---- Preset looks: fixed chains of the slider adjustments -----------------------------------
+ * The partial variants run the full look into a scratch image and, inside the bounds (clipped to
+ * the image), copy the look's pixel where the mask byte is 1 and the source pixel elsewhere;
+ * pixels outside the bounds are not written. Empty bounds (left > right or top > bottom) write
+ * the whole look without reading the mask. Nothing is written when the scratch image cannot be
+ * allocated. dst may be src. Downlight runs auto adjust as its second pass and so follows the
+ * auto-adjust parameters below. */
+
+PHOTOFX_API void applyRetro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyRetroPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                   int32_t width, int32_t height, int32_t left, int32_t right,
+                                   int32_t top, int32_t bottom);
+PHOTOFX_API void applySunshine(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applySunshinePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+PHOTOFX_API void applyDownlight(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyDownlightPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t left, int32_t right,
+                                       int32_t top, int32_t bottom);
+PHOTOFX_API void applyBluewash(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyBluewashPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+PHOTOFX_API void applyNostalgia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyNostalgiaPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                       int32_t width, int32_t height, int32_t left, int32_t right,
+                                       int32_t top, int32_t bottom);
+PHOTOFX_API void applyYellowglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyYellowglowPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t left, int32_t right,
+                                        int32_t top, int32_t bottom);
+
+PHOTOFX_API void fx_apply_retro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void fx_apply_retro_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t left, int32_t right,
+                                        int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_sunshine(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API void fx_apply_sunshine_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_downlight(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+PHOTOFX_API void fx_apply_downlight_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                            int32_t width, int32_t height, int32_t left,
+                                            int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_bluewash(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API void fx_apply_bluewash_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_nostalgia(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+PHOTOFX_API void fx_apply_nostalgia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                            int32_t width, int32_t height, int32_t left,
+                                            int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API void fx_apply_yellowglow(const uint32_t* src, uint32_t* dst, int32_t width,
+                                     int32_t height);
+PHOTOFX_API void fx_apply_yellowglow_partial(const uint32_t* src, const uint8_t* mask,
+                                             uint32_t* dst, int32_t width, int32_t height,
+                                             int32_t left, int32_t right, int32_t top,
+                                             int32_t bottom);
+
+/* ---- Auto adjust: tone mapping from the image's lightness histogram --------------------------
+ * Images under 150 pixels in either direction get contrast level 12 instead. The four
+ * parameters are read at the start of each call; fx_set_hdr must not run during one. A value
+ * stored into a parameter directly, outside its range, counts as the nearer end of the range. */
+
+PHOTOFX_API extern int32_t g_HDR_Threshold; /* 0..127, initially 70: bright share (percent) that
+                                                selects weight 2 */
+PHOTOFX_API extern int32_t g_HDR_CutOff;    /* 0..100, initially 100: top of the tone curve */
+PHOTOFX_API extern int32_t g_HDR_Weight1;   /* 300..8196, initially 1000: uniform weight */
+PHOTOFX_API extern int32_t g_HDR_Weight2;   /* 300..8196, initially 5120: the same, bright image */
+
+/* PHOTOFX_SUCCESS; PHOTOFX_OUT_OF_MEMORY with dst untouched; PHOTOFX_INVALID_ARGUMENT for a null
+ * buffer or an image too large to address. dst may be src. */
+PHOTOFX_API int32_t fx_process_hdr(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+PHOTOFX_API int32_t applyAutoAdjust(const uint32_t* src, uint32_t* dst, int32_t width,
+                                    int32_t height);
+/* Stores each value that lies in its parameter's range; the others are ignored. */
+PHOTOFX_API void fx_set_hdr(int32_t threshold, int32_t cutoff, int32_t weight1, int32_t weight2);
+PHOTOFX_API int32_t fx_get_threshold_hdr(void);
+PHOTOFX_API int32_t fx_get_cutoff_hdr(void);
+PHOTOFX_API int32_t fx_get_weight1_hdr(void);
+PHOTOFX_API int32_t fx_get_weight2_hdr(void);
+
 #ifdef __cplusplus
 } /* extern "C" */
 #endif

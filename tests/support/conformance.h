@@ -53,6 +53,25 @@ inline Input noise_input() {
   return {"noise", 61, 37, random_image(61, 37, 2026), random_mask(61, 37, 37)};
 }
 
+// The photograph enlarged by repeating each pixel `factor` times in each direction, with its own
+// mask: for effects that behave differently on larger images (auto adjust works from its tone
+// curve only from 150 x 150 up).
+inline Input enlarged_photo_input(int32_t factor) {
+  const Input photo = photo_input();
+  if (photo.pixels.size() != 64u * 48u) return photo;
+  const int32_t w = photo.width * factor, h = photo.height * factor;
+  Pixels px(static_cast<size_t>(w) * static_cast<size_t>(h));
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      px[static_cast<size_t>(y) * w + x] =
+          photo.pixels[static_cast<size_t>(y / factor) * photo.width + x / factor];
+    }
+  }
+  std::string name = "photo x";
+  name += std::to_string(factor);
+  return {name, w, h, px, random_mask(w, h, 4800 + factor)};
+}
+
 inline const std::vector<Input>& conformance_inputs() {
   static const std::vector<Input> inputs = {noise_input(), photo_input()};
   return inputs;

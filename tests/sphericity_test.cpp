@@ -1,0 +1,249 @@
+// Sphericity: the falloff table, the fixed points of the warp (level 0, the centre, the rim),
+// the argument checks, the window and fast mode, and positions on images wide enough that 32-bit
+// arithmetic would overflow.
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <cstdlib>
+
+#include "photofx.h"
+#include "support/images.h"
+
+namespace {
+
+using pfx::test::Pixels;
+
+constexpr uint32_t kOpaque = 0xFF000000u;
+
+// Random colours with alpha 0x40, so that the opaque alpha of a warped pixel marks it.
+Pixels translucent_image(int32_t w, int32_t h, uint64_t seed) {
+  Pixels px = pfx::test::random_image(w, h, seed);
+  for (uint32_t& p : px) p = (p & 0xFFFFFFu) | 0x40000000u;
+  return px;
+}
+
+struct Warped {
+  int32_t code;
+  Pixels px;
+};
+
+Warped sphericity(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
+                  int32_t level, int32_t left, int32_t right, int32_t top, int32_t bottom,
+                  uint32_t fast = 0) {
+  Warped r{0, Pixels(src.size(), 0xDEADBEEFu)};
+  r.code = fx_sphericity(src.data(), r.px.data(), w, h, cx, cy, radius, level, left, right, top,
+                         bottom, fast);
+  return r;
+}
+
+// The whole image as the window.
+Warped sphericity(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
+                  int32_t level, uint32_t fast = 0) {
+  return sphericity(src, w, h, cx, cy, radius, level, 0, w - 1, 0, h - 1, fast);
+}
+
+TEST(Sphericity, FalloffTableHasItsGivenShape) {
+  EXPECT_EQ(EXP_n7[0], 66974646);
+  EXPECT_EQ(EXP_n7[128], 2019149);
+  EXPECT_EQ(EXP_n7[255], 18969);
+  // Two irregularities of the curve that are part of it: a rise at 205 and a drop after 230.
+  EXPECT_GT(EXP_n7[205], EXP_n7[204]);
+  EXPECT_EQ(EXP_n7[231], 85473);
+  int64_t sum = 0;
+  for (int32_t v : EXP_n7) sum += v;
+  EXPECT_EQ(sum, 2483496352);
+}
+
+TEST(Sphericity, LevelZeroKeepsColoursAndMakesTheCircleOpaque) {
+  const int32_t w = 23, h = 19, cx = 11, cy = 8, radius = 6;
+  const Pixels src = pfx::test::random_image(w, h, 5);
+  const Warped r = sphericity(src, w, h, cx, cy, radius, 0);
+  ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
+  const int32_t rim = (radius * radius * 500 + 128) >> 8;
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      const size_t i = static_cast<size_t>(y * w + x);
+      const bool inside = (x - cx) * (x - cx) + (y - cy) * (y - cy) <= rim;
+      EXPECT_EQ(r.px[i], inside ? (src[i] | kOpaque) : src[i]) << x << "," << y;
+    }
+  }
+}
+
+TEST(Sphericity, CentreMapsToItselfAtEveryLevel) {
+  const Pixels src = pfx::test::random_image(15, 15, 6);
+  for (int32_t level : {-100, -37, -1, 1, 50, 100}) {
+    const Warped r = sphericity(src, 15, 15, 7, 6, 5, level);
+    EXPECT_EQ(r.px[6 * 15 + 7], src[6 * 15 + 7] | kOpaque) << level;
+  }
+}
+
+TEST(Sphericity, RimIsWarpedAndReadsAZeroFalloffWhilePixelsBeyondItAreCopied) {
+  const Pixels src = translucent_image(30, 30, 7);
+  const auto at = [](const Pixels& px, int32_t x, int32_t y) { return px[y * 30 + x]; };
+  // Radius 1 puts the rim at d2 = 2, where the falloff index is exactly 256: k = 0, so the pixel
+  // samples itself at either extreme level. d2 = 1 lies inside, d2 = 4 outside.
+  for (int32_t level : {-100, 100}) {
+    const Warped r = sphericity(src, 30, 30, 10, 10, 1, level);
+    EXPECT_EQ(at(r.px, 11, 11), at(src, 11, 11) | kOpaque);
+    EXPECT_EQ(at(r.px, 9, 9), at(src, 9, 9) | kOpaque);
+    EXPECT_EQ(at(r.px, 11, 10) >> 24, 0xFFu);
+    EXPECT_EQ(at(r.px, 12, 10), at(src, 12, 10));
+  }
+  // Radius 8: rim 125 = 10^2 + 5^2 is warped, 11^2 + 3^2 = 130 is not.
+  const Warped r = sphericity(src, 30, 30, 12, 12, 8, 80);
+  EXPECT_EQ(at(r.px, 22, 17) >> 24, 0xFFu);
+  EXPECT_EQ(at(r.px, 2, 7) >> 24, 0xFFu);
+  EXPECT_EQ(at(r.px, 23, 15), at(src, 23, 15));
+  EXPECT_EQ(at(r.px, 1, 9), at(src, 1, 9));
+}
+
+TEST(Sphericity, BadArgumentsWriteNothing) {
+  const Pixels src = pfx::test::random_image(8, 6, 8);
+  Pixels dst(src.size(), 0xDEADBEEFu);
+  const Pixels before = dst;
+  const auto call = [&](const uint32_t* s, uint32_t* d, int32_t cx, int32_t cy, int32_t radius,
+                        int32_t level) {
+    return fx_sphericity(s, d, 8, 6, cx, cy, radius, level, 0, 7, 0, 5, 0);
+  };
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 0, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, -5, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, 101), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, -101), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), -1, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 8, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 6, 3, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, -1, 3, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(nullptr, dst.data(), 4, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), nullptr, 4, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(dst, before);
+  runSphericity(src.data(), dst.data(), 8, 6, 4, 3, 3, 200, 0, 7, 0, 5, 0);
+  EXPECT_EQ(dst, before);
+  // In place the warp would read pixels it had already moved: refused.
+  Pixels same = src;
+  EXPECT_EQ(fx_sphericity(same.data(), same.data(), 8, 6, 4, 3, 3, 50, 0, 7, 0, 5, 0),
+            PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(same, src);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, -100), PHOTOFX_SUCCESS);
+}
+
+TEST(Sphericity, OnlyTheWindowIsWarpedAndItIsClippedToTheImage) {
+  const int32_t w = 20, h = 16;
+  const Pixels src = pfx::test::random_image(w, h, 9);
+  const Warped full = sphericity(src, w, h, 10, 8, 20, 70);
+  const Warped part = sphericity(src, w, h, 10, 8, 20, 70, 4, 12, 3, 9);
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      const size_t i = static_cast<size_t>(y * w + x);
+      const bool in = x >= 4 && x <= 12 && y >= 3 && y <= 9;
+      EXPECT_EQ(part.px[i], in ? full.px[i] : src[i]) << x << "," << y;
+    }
+  }
+  const Warped huge = sphericity(src, w, h, 10, 8, 20, 70, INT32_MIN, INT32_MAX, -5, 1000);
+  EXPECT_EQ(huge.px, full.px);
+  const Warped empty = sphericity(src, w, h, 10, 8, 20, 70, 5, 4, 0, h - 1);
+  EXPECT_EQ(empty.px, src);
+}
+
+TEST(Sphericity, FastModeFillsBlocksWithTheValueOfTheirTopLeftPixel) {
+  const int32_t w = 24, h = 20;
+  const Pixels src = pfx::test::random_image(w, h, 10);
+  // A circle that covers the window, so every block is computed.
+  for (int32_t level : {-80, 60}) {
+    const Warped normal = sphericity(src, w, h, 12, 10, 30, level, 2, 17, 3, 14);
+    const Warped fast = sphericity(src, w, h, 12, 10, 30, level, 2, 17, 3, 14, 1);
+    for (int32_t y = 3; y <= 14; ++y) {
+      for (int32_t x = 2; x <= 17; ++x) {
+        const int32_t ax = x - (x - 2) % 2, ay = y - (y - 3) % 2;
+        EXPECT_EQ(fast.px[static_cast<size_t>(y * w + x)],
+                  normal.px[static_cast<size_t>(ay * w + ax)])
+            << x << "," << y;
+      }
+    }
+  }
+}
+
+TEST(Sphericity, FastModeNeverWritesPastTheWindow) {
+  const int32_t w = 9, h = 7;
+  const Pixels src = translucent_image(w, h, 11);
+  // Odd window sizes, and a window ending at the image's last row and column.
+  const Warped r = sphericity(src, w, h, 4, 3, 30, 90, 1, 5, 0, 2, 1);
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      if (x < 1 || x > 5 || y > 2) {
+        EXPECT_EQ(r.px[y * w + x], src[y * w + x]) << x << "," << y;
+      }
+    }
+  }
+  EXPECT_EQ(r.px[2 * w + 5] >> 24, 0xFFu);
+  const Warped edge = sphericity(src, w, h, 4, 3, 30, 90, 1);
+  EXPECT_EQ(edge.code, PHOTOFX_SUCCESS);
+  EXPECT_EQ(edge.px[h * w - 1] >> 24, 0xFFu);
+}
+
+// One row whose pixels name their distance from column c: red counts blocks of 256 columns,
+// green runs up and down within them (a triangle wave), so a blend of two neighbouring pixels
+// still names one of the two, and a sampled pixel tells how far out the warp read it.
+Pixels distance_code(int32_t w, int32_t c) {
+  Pixels px(static_cast<size_t>(w));
+  for (int32_t x = 0; x < w; ++x) {
+    const int32_t d = std::abs(x - c), block = d >> 8, within = d & 255;
+    px[static_cast<size_t>(x)] = pfx::test::argb(0, block, block % 2 ? 255 - within : within, 0);
+  }
+  return px;
+}
+int32_t distance_named(uint32_t p) {
+  const int32_t block = static_cast<int32_t>(p >> 16 & 255), g = static_cast<int32_t>(p >> 8 & 255);
+  return block * 256 + (block % 2 ? 255 - g : g);
+}
+
+TEST(Sphericity, FarFromTheOriginTheWarpMovesWithItsCentre) {
+  // At x = 11000, x * 2^18 and cx * k pass 2^31; 1000 columns in, nothing comes near it. The
+  // same circle must give the same pixels in both places.
+  const int32_t h = 5, big_w = 12000, small_w = 2000, shift = 10000;
+  const Pixels big = pfx::test::random_image(big_w, h, 12);
+  Pixels small(static_cast<size_t>(small_w) * h);
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < small_w; ++x) small[y * small_w + x] = big[y * big_w + x + shift];
+  }
+  for (int32_t level : {-100, -41, 0, 57, 100}) {
+    const Warped far = sphericity(big, big_w, h, 11000, 2, 300, level, 10500, 11500, 0, h - 1);
+    const Warped near = sphericity(small, small_w, h, 1000, 2, 300, level);
+    ASSERT_EQ(far.code, PHOTOFX_SUCCESS);
+    for (int32_t y = 0; y < h; ++y) {
+      for (int32_t x = 0; x < small_w; ++x) {
+        ASSERT_EQ(far.px[y * big_w + x + shift], near.px[y * small_w + x]) << level << " " << x;
+      }
+    }
+  }
+}
+
+TEST(Sphericity, WidePinchAndBulgeSampleBetweenTheLimitsOfTheirPull) {
+  // Each output must come from a column pushed out by at most 147 % (pinch) or pulled in by at
+  // most 79 % (bulge). The centre column, 35000, times the bulge's pull passes 2^31 at either
+  // radius; k * dx of the pinch passes it only where the pull stays strong far out, which
+  // radius 25000 gives (its squared rim exceeds 2^30, so the falloff index stays 0).
+  const int32_t w = 70001, cx = 35000;
+  const Pixels src = distance_code(w, cx);
+  for (int32_t radius : {4500, 25000}) {
+    const int64_t rim = (int64_t{radius} * radius * 500 + 128) >> 8;
+    for (int32_t level : {-100, 100}) {
+      const Warped r = sphericity(src, w, 1, cx, 0, radius, level);
+      ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
+      for (int32_t x = 0; x < w; ++x) {
+        const int32_t d = std::abs(x - cx);
+        const int32_t from = distance_named(r.px[static_cast<size_t>(x)]);
+        if (int64_t{d} * d > rim) {
+          ASSERT_EQ(from, d) << x;
+        } else if (level < 0) {
+          ASSERT_GE(from, d - 1) << radius << " " << x;
+          ASSERT_LE(from, d + d * 147 / 100 + 1) << radius << " " << x;
+        } else {
+          ASSERT_LE(from, d + 1) << radius << " " << x;
+          ASSERT_GE(from, d * 21 / 100 - 1) << radius << " " << x;
+        }
+      }
+    }
+  }
+}
+
+}  // namespace

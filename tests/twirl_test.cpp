@@ -1,0 +1,195 @@
+// Twirl: the square-root and sine tables against <cmath>, the fixed points of the warp (angle 0,
+// the centre, the rim), the direction of the turn, the argument checks, fast mode, and radii
+// whose distances need more than 31 bits.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <cstdlib>
+
+#include "photofx.h"
+#include "support/images.h"
+
+namespace {
+
+using pfx::test::Pixels;
+
+constexpr uint32_t kOpaque = 0xFF000000u;
+
+// Random colours with alpha 0x40, so that the opaque alpha of a warped pixel marks it.
+Pixels translucent_image(int32_t w, int32_t h, uint64_t seed) {
+  Pixels px = pfx::test::random_image(w, h, seed);
+  for (uint32_t& p : px) p = (p & 0xFFFFFFu) | 0x40000000u;
+  return px;
+}
+
+TEST(TwirlTables, SquareRootStepsAreTheRoundedRootsOfTheirLowerEnds) {
+  const auto check = [](const int32_t* table, int32_t n, int32_t step, int32_t first_u) {
+    for (int32_t j = 0; j < n; ++j) {
+      const double u = static_cast<double>(step) * j + first_u;
+      ASSERT_EQ(table[j], static_cast<int32_t>(std::llround(256.0 * std::sqrt(u)))) << j;
+    }
+  };
+  check(SQRT_STEP_1, 128, 1, 0);
+  check(SQRT_STEP_2, 480, 4, 128);
+  check(SQRT_STEP_3, 768, 8, 2048);
+  check(SQRT_STEP_4, 65536, 64, 0);
+}
+
+TEST(TwirlTables, SineIsTheRoundedQuarterWave) {
+  for (int32_t k = 0; k <= 4096; ++k) {
+    const double exact = 32768.0 * std::sin(2.0 * 3.14159265358979323846 * k / 16384.0);
+    ASSERT_GT(std::fabs(exact - std::floor(exact) - 0.5), 1e-6) << k;
+    ASSERT_EQ(SIN[k], static_cast<int32_t>(std::llround(exact))) << k;
+  }
+  EXPECT_EQ(SIN[3655], 32301);  // 32300.50003 to 60 digits, the entry closest to a half
+}
+
+struct Warped {
+  int32_t code;
+  Pixels px;
+};
+
+Warped twirl(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
+             int32_t angle, int32_t left, int32_t right, int32_t top, int32_t bottom,
+             uint32_t fast = 0) {
+  Warped r{0, Pixels(src.size(), 0xDEADBEEFu)};
+  r.code = fx_twirl(src.data(), r.px.data(), w, h, cx, cy, radius, angle, left, right, top, bottom,
+                    fast);
+  return r;
+}
+
+Warped twirl(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
+             int32_t angle, uint32_t fast = 0) {
+  return twirl(src, w, h, cx, cy, radius, angle, 0, w - 1, 0, h - 1, fast);
+}
+
+TEST(Twirl, AngleZeroCopiesTheImageExactly) {
+  const Pixels src = pfx::test::random_image(17, 13, 20);
+  const Warped r = twirl(src, 17, 13, 8, 6, 40, 0);
+  EXPECT_EQ(r.code, PHOTOFX_SUCCESS);
+  EXPECT_EQ(r.px, src);
+}
+
+TEST(Twirl, CentreMapsToItselfAndOnlyPixelsStrictlyInsideAreWarped) {
+  const Pixels src = translucent_image(21, 21, 21);
+  for (int32_t angle : {-360, -90, 1, 45, 200, 360}) {
+    const Warped r = twirl(src, 21, 21, 10, 10, 5, angle);
+    ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
+    EXPECT_EQ(r.px[10 * 21 + 10], src[10 * 21 + 10] | kOpaque) << angle;
+    for (int32_t y = 0; y < 21; ++y) {
+      for (int32_t x = 0; x < 21; ++x) {
+        const size_t i = static_cast<size_t>(y * 21 + x);
+        const int32_t d2 = (x - 10) * (x - 10) + (y - 10) * (y - 10);
+        // d2 = 25 (for example 3^2 + 4^2) lies on the rim and keeps its pixel.
+        if (d2 >= 25) {
+          EXPECT_EQ(r.px[i], src[i]) << x << "," << y;
+        } else {
+          EXPECT_EQ(r.px[i] >> 24, 0xFFu) << x << "," << y;
+        }
+      }
+    }
+  }
+}
+
+TEST(Twirl, PositiveAnglesTurnFromDownTowardRight) {
+  // Left half blue, right half red, the centre column green. Near the centre the twist is
+  // almost the full angle, so the pixel two below the centre samples two to the right of it
+  // for +90 and two to the left for -90.
+  const int32_t w = 41, h = 41, c = 20;
+  Pixels src(static_cast<size_t>(w * h));
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      src[y * w + x] = x < c ? 0xFF0000FFu : (x > c ? 0xFFFF0000u : 0xFF00FF00u);
+    }
+  }
+  EXPECT_EQ(twirl(src, w, h, c, c, 20, 90).px[(c + 2) * w + c], 0xFFFF0000u);
+  EXPECT_EQ(twirl(src, w, h, c, c, 20, -90).px[(c + 2) * w + c], 0xFF0000FFu);
+}
+
+TEST(Twirl, BadArgumentsWriteNothing) {
+  const Pixels src = pfx::test::random_image(8, 6, 22);
+  Pixels dst(src.size(), 0xDEADBEEFu);
+  const Pixels before = dst;
+  const auto call = [&](const uint32_t* s, uint32_t* d, int32_t cx, int32_t cy, int32_t radius,
+                        int32_t angle) {
+    return fx_twirl(s, d, 8, 6, cx, cy, radius, angle, 0, 7, 0, 5, 0);
+  };
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, 361), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, -361), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 0, 90), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 8, 3, 3, 90), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, -1, 3, 90), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 6, 3, 90), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(nullptr, dst.data(), 4, 3, 3, 90), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(call(src.data(), nullptr, 4, 3, 3, 90), PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(dst, before);
+  runTwirl(src.data(), dst.data(), 8, 6, 4, 3, 0, 90, 0, 7, 0, 5, 0);
+  EXPECT_EQ(dst, before);
+  Pixels same = src;
+  EXPECT_EQ(fx_twirl(same.data(), same.data(), 8, 6, 4, 3, 3, 90, 0, 7, 0, 5, 0),
+            PHOTOFX_INVALID_ARGUMENT);
+  EXPECT_EQ(same, src);
+  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 1, 360), PHOTOFX_SUCCESS);
+}
+
+TEST(Twirl, FastModeFillsBlocksInsideTheClippedWindowOnly) {
+  const int32_t w = 24, h = 21;
+  const Pixels src = translucent_image(w, h, 23);
+  // The circle covers the window, so every block is computed from its top-left pixel.
+  const Warped normal = twirl(src, w, h, 12, 10, 40, 150, 3, 18, 2, 14);
+  const Warped fast = twirl(src, w, h, 12, 10, 40, 150, 3, 18, 2, 14, 1);
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      const size_t i = static_cast<size_t>(y * w + x);
+      if (x < 3 || x > 18 || y < 2 || y > 14) {
+        EXPECT_EQ(fast.px[i], src[i]) << x << "," << y;
+        continue;
+      }
+      const int32_t ax = x - (x - 3) % 2, ay = y - (y - 2) % 2;
+      EXPECT_EQ(fast.px[i], normal.px[static_cast<size_t>(ay * w + ax)]) << x << "," << y;
+    }
+  }
+  // A window past every edge of an odd-sized image stays inside it.
+  const Warped wide = twirl(src, w, h, 12, 10, 40, 150, -7, 1000, -3, 500, 1);
+  EXPECT_EQ(wide.code, PHOTOFX_SUCCESS);
+  EXPECT_EQ(wide.px[static_cast<size_t>(h * w - 1)] >> 24, 0xFFu);
+}
+
+// One row whose pixels name their distance from column c: red counts blocks of 256 columns,
+// green runs up and down within them, so a blend of two neighbours still names one of them.
+Pixels distance_code(int32_t w, int32_t c) {
+  Pixels px(static_cast<size_t>(w));
+  for (int32_t x = 0; x < w; ++x) {
+    const int32_t d = std::abs(x - c), block = d >> 8, within = d & 255;
+    px[static_cast<size_t>(x)] = pfx::test::argb(0, block, block % 2 ? 255 - within : within, 0);
+  }
+  return px;
+}
+int32_t distance_named(uint32_t p) {
+  const int32_t block = static_cast<int32_t>(p >> 16 & 255), g = static_cast<int32_t>(p >> 8 & 255);
+  return block * 256 + (block % 2 ? 255 - g : g);
+}
+
+TEST(Twirl, LargeRadiiKeepEachPixelAtItsDistanceNearTheRim) {
+  // Radius 5000 makes radius * rho pass 2^31 beyond about 4100 pixels out; radius 40000 is far
+  // past where the 30-bit reciprocal of radius^2 would be 0. Near the rim the twist is small,
+  // so a pixel on the row of the centre samples close to its own distance; the weighting of the
+  // distance's bytes adds at most half a pixel.
+  for (int32_t radius : {5000, 40000}) {
+    const int32_t c = radius, w = 2 * radius + 1;
+    const Pixels src = distance_code(w, c);
+    const Warped r = twirl(src, w, 1, c, 0, radius, 90);
+    ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
+    for (int32_t x = 0; x < w; ++x) {
+      const int32_t d = std::abs(x - c);
+      if (d < radius * 85 / 100) continue;
+      // The twist is at most 90 * (1 - 0.85) = 13.5 degrees: |sin| >= 0.97.
+      const int32_t got = distance_named(r.px[static_cast<size_t>(x)]);
+      ASSERT_LE(got, d + 1) << radius << " " << x;
+      ASSERT_GE(got, d * 97 / 100 - 1) << radius << " " << x;
+    }
+  }
+}
+
+}  // namespace

@@ -1,0 +1,262 @@
+// The registry: one entry per effect the command-line tool offers. See tools/effect.h for what
+// each field means; the table is checked when it is compiled (names, ranges, defaults).
+#include <string>
+#include <string_view>
+
+#include "photofx.h"
+#include "tools/effect.h"
+
+namespace fxtool {
+namespace {
+
+// clang-format off
+constexpr Effect kEffects[] = {
+    // ---- Tone and colour adjustments --------------------------------------------------------
+    {.name = "brightness",
+     .family = "adjust",
+     .summary = "lighter or darker: moves the luma and keeps the colour",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlBrightness, controlBrightnessPartial>,
+     .gallery = "level=0;level=5;level=15;level=20"},
+    {.name = "contrast",
+     .family = "adjust",
+     .summary = "pushes each channel away from mid grey, or draws it toward it below 10",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlContrast, controlContrastPartial>,
+     .gallery = "level=0;level=5;level=15;level=20"},
+    {.name = "saturation",
+     .family = "adjust",
+     .summary = "more or less colourful: 0 is grey, 20 about doubles each colour's distance from it",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlSaturation, controlSaturationPartial>,
+     .gallery = "level=0;level=5;level=15;level=20"},
+    {.name = "temperature",
+     .family = "adjust",
+     .summary = "warmer above 10 (more red, less blue), cooler below",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlTemperature, controlTemperaturePartial>,
+     .gallery = "level=0;level=5;level=15;level=20"},
+    {.name = "exposure",
+     .family = "adjust",
+     .summary = "each channel times level / 10: 0 is black, 20 doubles",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlExposure, controlExposurePartial>,
+     .gallery = "level=5;level=15;level=20"},
+    {.name = "hue",
+     .family = "adjust",
+     .summary = "turns every colour round the colour wheel, 18 degrees per step",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .run = full_and_partial<controlHue, controlHuePartial>,
+     .gallery = "level=0;level=5;level=15"},
+    {.name = "faded-colour",
+     .family = "adjust",
+     .summary = "blends toward a washed-out, warm-tinted copy",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 100, 0, "percent faded; 0 leaves the image as it is")},
+     .run = full_and_partial<controlFadedColour, controlFadedColourPartial>,
+     .gallery = "level=25;level=50;level=100"},
+    {.name = "invert",
+     .family = "adjust",
+     .summary = "the negative: each colour channel becomes 255 minus itself",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyInvert, applyInvertPartial>,
+     .gallery = ""},
+    {.name = "channel-gains",
+     .family = "adjust",
+     .summary = "a slider per channel: a step adds 6 to its channel and takes 3 from the others",
+     .selects = Selects::kMask,
+     .params = {integer("red", 0, 20, 10, "red slider; 10 leaves the channel as it is"),
+                integer("green", 0, 20, 10, "green slider; 10 leaves the channel as it is"),
+                integer("blue", 0, 20, 10, "blue slider; 10 leaves the channel as it is")},
+     .run = full_and_partial<controlAdjustRGB, AdjustRGB>,
+     .gallery = "red=20;green=20;blue=20;red=14,green=12,blue=4"},
+    {.name = "colour-tone",
+     .family = "adjust",
+     .summary = "repaints the picture in one hue at low saturation",
+     .selects = Selects::kByTool,
+     .params = {integer("hue", 0, 360, 30, "the hue in degrees: 0 red, 120 green, 240 blue")},
+     .run = full_only<fx_change_colortone>,
+     .gallery = "hue=30;hue=200"},
+    {.name = "lighten",
+     .family = "adjust",
+     .summary = "brush: lightens a disc, most at its centre; the disc becomes opaque",
+     .selects = Selects::kByTool,
+     .params = {column("cx", 500, "the disc's centre column"),
+                row("cy", 500, "the disc's centre row"),
+                integer("strength", 0, 255, 64, "how much the centre's channels rise"),
+                length("radius", 1, 250, "the disc's radius in pixels")},
+     .run = [](const Call& c) {
+       rubLighten(c.dst(), c.arg(0), c.arg(1), c.width(), c.height(), c.arg(2), c.arg(3));
+       return std::string();
+     },
+     .gallery = ";strength=255"},
+    {.name = "darken",
+     .family = "adjust",
+     .summary = "brush: darkens a disc, most at its centre; the disc becomes opaque",
+     .selects = Selects::kByTool,
+     .params = {column("cx", 500, "the disc's centre column"),
+                row("cy", 500, "the disc's centre row"),
+                integer("strength", 0, 255, 64, "how much the centre's channels fall"),
+                length("radius", 1, 250, "the disc's radius in pixels")},
+     .run = [](const Call& c) {
+       rubDarken(c.dst(), c.arg(0), c.arg(1), c.width(), c.height(), c.arg(2), c.arg(3));
+       return std::string();
+     },
+     .gallery = ";strength=255"},
+
+    // ---- Blur ---------------------------------------------------------------------------------
+    {.name = "blur",
+     .family = "blur",
+     .summary = "soft blur of the selection, or of everything, on a scaled-down copy",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
+     .run = [](const Call& c) {
+       const Bounds& b = c.bounds;
+       applyBlur(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(0), b.left, b.right,
+                 b.top, b.bottom);
+       return std::string();
+     },
+     .gallery = "level=0;level=4;level=8"},
+    {.name = "blur-preview",
+     .family = "blur",
+     .summary = "the same blur through a preview session, as an editor's slider runs it",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
+     .run = [](const Call& c) {
+       const Bounds& b = c.bounds;
+       fx_Init_blur(c.src(), c.mask, c.width(), c.height(), b.left, b.right, b.top, b.bottom);
+       fx_make_blur_preview(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(0));
+       fx_destroy_blur();
+       return std::string();
+     },
+     .gallery = "level=4"},
+    {.name = "tilt-shift",
+     .family = "blur",
+     .summary = "a sharp horizontal band, the picture blurring away above and below it",
+     .selects = Selects::kByTool,
+     .params = {row("centre", 500, "the row in the middle of the sharp band"),
+                rows("half-height", 125, "rows kept sharp on each side of the centre")},
+     .run = full_only<applyTiltShift>,
+     .gallery = ""},
+    {.name = "tilt-shift-preview",
+     .family = "blur",
+     .summary = "the same tilt-shift through a preview session",
+     .selects = Selects::kByTool,
+     .params = {row("centre", 500, "the row in the middle of the sharp band"),
+                rows("half-height", 125, "rows kept sharp on each side of the centre")},
+     .run = [](const Call& c) {
+       initTiltShift(c.src(), c.width(), c.height());
+       makeTiltShift(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.arg(1));
+       destroyTiltShift();
+       return std::string();
+     },
+     .gallery = ""},
+};
+// clang-format on
+
+// ---- Checks on the table, made by the compiler ----------------------------------------------
+
+constexpr bool same(const char* a, const char* b) {
+  while (*a != '\0' && *a == *b) ++a, ++b;
+  return *a == *b;
+}
+
+// Lower-case words joined by '-', as command-line names are written.
+constexpr bool is_option_name(const char* s) {
+  if (*s == '\0' || *s == '-') return false;
+  char last = '\0';
+  for (; *s != '\0'; last = *s++) {
+    const bool ok = (*s >= 'a' && *s <= 'z') || (*s >= '0' && *s <= '9') || *s == '-';
+    if (!ok || (*s == '-' && last == '-')) return false;
+  }
+  return last != '-';
+}
+
+// The tool's own options; an effect parameter must not take one of these names.
+constexpr const char* kReserved[] = {"mask", "rect", "ellipse", "out-dir", "progress", "help"};
+
+constexpr bool param_ok(const Param& p) {
+  if (!is_option_name(p.name) || p.help == nullptr || p.help[0] == '\0') return false;
+  for (const char* r : kReserved) {
+    if (same(p.name, r)) return false;
+  }
+  switch (p.kind) {
+    case Kind::kChoice:
+      return p.extent == Extent::kNone && p.choices != nullptr && p.choice_count > 0 &&
+             p.def >= 0 && p.def < p.choice_count && static_cast<int32_t>(p.def) == p.def;
+    case Kind::kReal:
+      return p.extent == Extent::kNone && p.min <= p.def && p.def <= p.max;
+    case Kind::kInteger:
+      if (p.min != static_cast<int32_t>(p.min) || p.max != static_cast<int32_t>(p.max) ||
+          p.def != static_cast<int32_t>(p.def)) {
+        return false;
+      }
+      if (p.extent == Extent::kNone) return p.min <= p.def && p.def <= p.max;
+      return p.def >= 0 && p.def <= 1000 && p.min >= 0 && p.max <= 0;
+  }
+  return false;
+}
+
+constexpr bool effect_ok(const Effect& e) {
+  // (A missing run function is caught when the effect runs: comparing function pointers is not
+  // a constant expression under the sanitizers.)
+  if (!is_option_name(e.name) || !is_option_name(e.family) || e.summary == nullptr) return false;
+  const size_t n = e.param_count();
+  for (size_t i = n; i < kMaxParams; ++i) {
+    if (e.params[i].name != nullptr) return false;  // no gaps in the list
+  }
+  for (size_t i = 0; i < n; ++i) {
+    if (!param_ok(e.params[i])) return false;
+    for (size_t j = 0; j < i; ++j) {
+      if (same(e.params[i].name, e.params[j].name)) return false;
+    }
+  }
+  return true;
+}
+
+// Index of the first entry with a bad name, parameter, range or default, or of one that repeats
+// an earlier name; -1 when all are sound. The compiler shows the index when the check fails.
+constexpr int first_bad_entry() {
+  for (size_t i = 0; i < std::size(kEffects); ++i) {
+    if (!effect_ok(kEffects[i])) return static_cast<int>(i);
+    for (size_t j = 0; j < i; ++j) {
+      if (same(kEffects[i].name, kEffects[j].name)) return static_cast<int>(i);
+    }
+  }
+  return -1;
+}
+
+static_assert(first_bad_entry() == -1, "see the entry at this index of kEffects");
+
+}  // namespace
+
+std::span<const Effect> effects() { return kEffects; }
+
+const Effect* find_effect(std::string_view name) {
+  for (const Effect& e : kEffects) {
+    if (name == e.name) return &e;
+  }
+  return nullptr;
+}
+
+std::string result_code(int32_t code) {
+  switch (code) {
+    case PHOTOFX_SUCCESS:
+      return {};
+    case PHOTOFX_OUT_OF_MEMORY:
+      return "the library ran out of memory";
+    case PHOTOFX_INVALID_ARGUMENT:
+      return "the library refused the arguments";
+    default:
+      return "the library returned the unknown code " + std::to_string(code);
+  }
+}
+
+}  // namespace fxtool
