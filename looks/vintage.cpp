@@ -10,6 +10,7 @@
 
 #include "frame/frame.h"
 #include "frame/pixel.h"
+#include "looks/preset.h"
 #include "looks/vignette.h"
 #include "photofx.h"
 
@@ -73,6 +74,13 @@ void fx_apply_vintage(const uint32_t* src, uint32_t* dst, int32_t width, int32_t
   fx_apply_vignette(dst, dst, width, height);
 }
 
+void fx_apply_vintage_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                              int32_t width, int32_t height, int32_t left, int32_t right,
+                              int32_t top, int32_t bottom) {
+  pfx::composite_preset(fx_apply_vintage, src, mask, dst, width, height,
+                        {left, right, top, bottom});
+}
+
 void fx_apply_vintage_prev(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   const pfx::PreviewVignette vignette(width, height);
   pfx::for_each_pixel_at(src, dst, width, height, [&](uint32_t p, int32_t x, int32_t y) {
@@ -86,6 +94,11 @@ void fx_apply_vintage_prev(const uint32_t* src, uint32_t* dst, int32_t width, in
 
 void applyVintage(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   fx_apply_vintage(src, dst, width, height);
+}
+
+void applyVintagePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                         int32_t height, int32_t left, int32_t right, int32_t top, int32_t bottom) {
+  fx_apply_vintage_partial(src, mask, dst, width, height, left, right, top, bottom);
 }
 
 }  // extern "C"

@@ -63,6 +63,33 @@ TEST(Vintage, KeepsAlphaLeavesTheSourceAndWorksInPlace) {
   EXPECT_EQ(dst, before);
 }
 
+// The full look composited through the mask inside the bounds, the source at unselected pixels
+// there, and nothing written outside them; empty bounds give the full look everywhere.
+TEST(Vintage, PartialCompositesTheFullLook) {
+  const int32_t w = 11, h = 9;
+  const Pixels img = pfx::test::random_image(w, h, 102);
+  const Mask mask = pfx::test::random_mask(w, h, 103);
+  const Pixels full = vintage(img, w, h);
+  Pixels part(img.size(), 0x0F0F0F0Fu);
+  applyVintagePartial(img.data(), mask.data(), part.data(), w, h, 2, 8, 1, 6);
+  for (int32_t y = 0; y < h; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      const size_t i = static_cast<size_t>(y * w + x);
+      const bool inside = x >= 2 && x <= 8 && y >= 1 && y <= 6;
+      EXPECT_EQ(part[i], !inside ? 0x0F0F0F0Fu : (mask[i] == 1 ? full[i] : img[i]))
+          << x << "," << y;
+    }
+  }
+  fx_apply_vintage_partial(img.data(), mask.data(), part.data(), w, h, 1, 0, 0, 8);
+  EXPECT_EQ(part, full);
+  // Without its scratch image the call writes nothing.
+  Pixels dst(img.size(), 0x0F0F0F0Fu);
+  pfx::arm_allocation_failure(1);
+  fx_apply_vintage_partial(img.data(), mask.data(), dst.data(), w, h, 1, 0, 0, 8);
+  pfx::arm_allocation_failure(0);
+  EXPECT_EQ(dst, Pixels(img.size(), 0x0F0F0F0Fu));
+}
+
 TEST(Vintage, PreviewAtTheCentre) {
   const auto centre = [](uint32_t colour) {
     const Pixels img = pfx::test::filled(9, 7, colour);
