@@ -163,16 +163,4 @@ TEST(ToneCurves, LevelsOutsideTheByteRangeDoNotOverflow) {
   EXPECT_EQ(huge[255], 255);
 }
 
-TEST(ToneCurves, InPlaceMatchesTwoBuffers) {
-  const Pixels img = pfx::test::random_image(7, 6, 83);
-  Pixels out(img.size()), in_place = img;
-  changeHistogramByOutput(img.data(), out.data(), 7, 6, 3, 20, 230);
-  changeHistogramByOutput(in_place.data(), in_place.data(), 7, 6, 3, 20, 230);
-  EXPECT_EQ(in_place, out);
-  in_place = img;
-  control_gamma(img.data(), out.data(), 7, 6, 1, 0.6);
-  control_gamma(in_place.data(), in_place.data(), 7, 6, 1, 0.6);
-  EXPECT_EQ(in_place, out);
-}
-
 }  // namespace
