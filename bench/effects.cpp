@@ -1,18 +1,14 @@
 // The effects the suite times: one entry per public effect, in the order the report lists them.
 //
-// Adding an effect is one entry. The common shapes need no code of their own:
+// Adding an effect is one entry. The common shapes need no code of their own, e.g.
 //
 //   {.name = "soft-glow", .goal = kHsvGoal, .peer = Peer::kHsv,
 //    .full = full<applySoftglow, 60>, .partial = partial<applySoftglowPartial, 60>},
-//   {.name = "gamma", .goal = kPointGoal, .peer = Peer::kLut,
-//    .full = full<control_gamma, 0, 0.77>},
-//   {.name = "pop-art-preview", .goal = kHsvGoal, .peer = Peer::kHsv,
-//    .full = full<fx_apply_popart_prev>},
 //
-// full<F, levels...> calls F(src, dst, width, height, levels...); partial<F, levels...> calls
-// F(src, mask, dst, width, height, levels..., left, right, top, bottom), with the ellipse's box
-// as bounds. Any other shape is a small function over the Frame: see the blur, the warps and
-// the brushes below.
+// full<F, levels...> calls F(src, dst, width, height, levels...) (levels may be doubles, as for
+// control_gamma); partial<F, levels...> calls F(src, mask, dst, width, height, levels..., left,
+// right, top, bottom), with the ellipse's box as bounds. Any other shape is a small function over
+// the Frame: see the blur, the textured old photo, the warps and the brushes below.
 //
 // Pick levels that change the image: the suite refuses a call that leaves its output equal to the
 // photograph (a refused argument would otherwise time as a fast no-op); set .changes = false only
@@ -116,6 +112,17 @@ void red_eye(const Frame& f) {
   removeRedeye(f.dst, f.width, f.height, f.width / 3, f.height / 3, eye_radius(f));
 }
 
+// ---- The textured old photo, with the photograph as its own texture ---------------------------
+
+void old_photo_texture(const Frame& f) {
+  fx_apply_oldphoto_texture(f.src, f.dst, f.src, f.width, f.height);
+}
+
+void old_photo_texture_partial(const Frame& f) {
+  fx_apply_oldphoto_texture_partial(f.src, f.dst, f.src, f.mask, f.width, f.height, f.left, f.right,
+                                    f.top, f.bottom);
+}
+
 // ---- Warps over the whole picture --------------------------------------------------------
 
 // Half the diagonal: a circle this wide around the centre reaches every corner.
@@ -165,14 +172,33 @@ constexpr Effect kEffects[] = {
      .full = full<controlGreyscale, 12>, .partial = partial<controlGreyscalePartial, 12>},
     {.name = "sepia", .goal = kPointGoal, .peer = Peer::kLut,
      .full = full<fx_apply_sepia>, .partial = partial<fx_apply_sepia_partial>},
+    {.name = "gamma", .goal = kPointGoal, .peer = Peer::kLut, .full = full<control_gamma, 0, 0.77>},
+    {.name = "levels-input", .goal = kPointGoal, .peer = Peer::kLut,
+     .full = full<changeHistogramByInput, 0, 28, 255>},
+    {.name = "levels-output", .goal = kPointGoal, .peer = Peer::kLut,
+     .full = full<changeHistogramByOutput, 0, 45, 255>},
 
     // ---- HSV-based effects -----------------------------------------------------------------
     {.name = "hue", .goal = kHsvGoal, .peer = Peer::kHsv,
      .full = full<controlHue, 14>, .partial = partial<controlHuePartial, 14>},
     {.name = "colour-tone", .goal = kHsvGoal, .peer = Peer::kHsv,
      .full = full<fx_change_colortone, 30>},
+    {.name = "pop-art-preview", .goal = kHsvGoal, .peer = Peer::kHsv,
+     .full = full<fx_apply_popart_prev>},
+    {.name = "soft-glow", .goal = kHsvGoal, .peer = Peer::kHsv,
+     .full = full<applySoftglow, 60>, .partial = partial<applySoftglowPartial, 60>},
 
-    // ---- Preset looks (downlight runs auto adjust inside, so it has no chain goal) and auto adjust
+    // ---- Film looks ------------------------------------------------------------------------
+    {.name = "vignette", .full = full<fx_apply_vignette>},
+    {.name = "vignette-preview", .full = full<fx_apply_vignette_prev>},
+    {.name = "vintage", .full = full<applyVintage>, .partial = partial<applyVintagePartial>},
+    {.name = "vintage-preview", .full = full<fx_apply_vintage_prev>},
+    {.name = "old-photo", .full = full<applyOldPhoto>, .partial = partial<applyOldPhotoPartial>},
+    {.name = "old-photo-texture", .full = old_photo_texture,
+     .partial = old_photo_texture_partial},
+    {.name = "pop-art", .full = full<applyPopArt>},
+
+    // ---- Preset looks (downlight runs auto adjust inside: no chain goal) and auto adjust ---
     {.name = "retro", .goal = kPresetGoal, .full = full<applyRetro>,
      .partial = partial<applyRetroPartial>},
     {.name = "sunshine", .goal = kPresetGoal, .full = full<applySunshine>,
