@@ -267,24 +267,6 @@ TEST_F(Tool, EachEffectFamilyMatchesTheLibrary) {
            applySharpen(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 0, 3, 11, 2, 7);
          });
        }},
-      {{"pixelize", "--shift", "2"},
-       [](const Image& s) {
-         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
-           applyPixelize(a, b, w, h, 2);
-         });
-       }},
-      {{"pixelize-brush", "--shift", "1", "--cx", "3", "--cy", "4", "--radius", "5"},
-       [](const Image& s) {
-         Image o = s;
-         rubPixelize(o.pixels.data(), s.width, s.height, 1, 3, 4, 5);
-         return o;
-       }},
-      {{"red-eye", "--cx", "10", "--cy", "8", "--radius", "4"},
-       [](const Image& s) {
-         Image o = s;
-         removeRedeye(o.pixels.data(), s.width, s.height, 10, 8, 4);
-         return o;
-       }},
       {{"greyscale", "--level", "14", "--rect", "3,2,9,6"},
        [](const Image& s) {
          return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
@@ -608,7 +590,8 @@ TEST_F(Tool, GalleryWritesEveryPictureTheSheetAndTheIndex) {
   }
   EXPECT_EQ(written, files);
 
-  // The effects without parameters, straight from the library's full variants.
+  // Pictures at the defaults, straight from the library: the looks' full variants, and the
+  // brushes, whose defaults are the middle of the picture and a quarter of its longer side.
   using Full = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t);
   const std::vector<std::pair<std::string, Full>> plain = {
       {"retro", applyRetro},
@@ -618,9 +601,18 @@ TEST_F(Tool, GalleryWritesEveryPictureTheSheetAndTheIndex) {
       {"nostalgia", applyNostalgia},
       {"yellow-glow", applyYellowglow},
       {"sepia",
-       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { fx_apply_sepia(a, b, w, h); }}};
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { fx_apply_sepia(a, b, w, h); }},
+      {"pixelize-shift-3",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { applyPixelize(a, b, w, h, 3); }},
+      {"pixelize-brush", [](const uint32_t*, uint32_t* b, int32_t w,
+                            int32_t h) { rubPixelize(b, w, h, 4, 11, 8, 5); }},
+      {"red-eye", [](const uint32_t*, uint32_t* b, int32_t w, int32_t h) {
+         removeRedeye(b, w, h, 11, 8, 5);
+       }}};
   for (const auto& [name, full] : plain) {
-    EXPECT_EQ(decoded(dir / ("g/" + name + ".png")).pixels, lib(src, full).pixels) << name;
+    const Image expected = lib(src, full);
+    EXPECT_NE(expected.pixels, src.pixels) << name;
+    EXPECT_EQ(decoded(dir / ("g/" + name + ".png")).pixels, expected.pixels) << name;
   }
 
   // The contact sheet: tiles side by side, with captions drawn in the title colour.
