@@ -16,6 +16,7 @@
 #include "support/files.h"
 #include "support/images.h"
 #include "tools/image.h"
+#include "tools/texture.h"
 
 namespace {
 
@@ -279,6 +280,35 @@ TEST_F(Tool, EachEffectFamilyMatchesTheLibrary) {
            fx_apply_sepia_partial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 3, 11, 2, 7);
          });
        }},
+      {{"gamma", "--channel", "green", "--gamma", "0.45"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           control_gamma(a, b, w, h, 2, 0.45);
+         });
+       }},
+      {{"input-levels", "--channel", "red", "--low", "30", "--high", "200", "--rect", "0,0,10,30"},
+       [](const Image& s) {
+         return where(s,
+                      lib(s, [](const uint32_t* a, uint32_t* b, int32_t w,
+                                int32_t h) { changeHistogramByInput(a, b, w, h, 1, 30, 200); }),
+                      [](int32_t x, int32_t) { return x < 10; });
+       }},
+      // The textured old photo writes only the selected pixels, over the tool's copy.
+      {{"old-photo-texture", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         const Image paper = fxtool::paper_texture(s.width, s.height);
+         Image o = s;
+         fx_apply_oldphoto_texture_partial(s.pixels.data(), o.pixels.data(), paper.pixels.data(),
+                                           rect_mask(3, 2, 11, 7).data(), s.width, s.height, 3, 11,
+                                           2, 7);
+         return o;
+       }},
+      {{"soft-glow", "--level", "80", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           applySoftglowPartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 80, 3, 11, 2, 7);
+         });
+       }},
       // The other looks' full variants are checked against the gallery's pictures.
       {{"sunshine", "--rect", "3,2,9,6"},
        [](const Image& s) {
@@ -491,6 +521,10 @@ TEST_F(Tool, BadCommandLinesAreRefusedWithStatusTwo) {
                  "--fast must be one of off, on, not 'yes'");
   expect_refused({"apply", "sphericity", "--level", "-101", in, out}, 2,
                  "--level -101 is out of range -100..100");
+  expect_refused({"apply", "gamma", "--gamma", "0.05", in, out}, 2,
+                 "--gamma 0.05 is out of range 0.1..10");
+  expect_refused({"apply", "gamma", "--gamma", "1,5", in, out}, 2,
+                 "--gamma needs a number, not '1,5'");
   expect_refused({"apply", "mirror", "--rect", "1,1,4,4", in, out}, 2,
                  "mirror takes no selection (it changes the image's size)");
 }
@@ -519,6 +553,8 @@ TEST_F(Tool, UnusableFilesAreRefusedWithStatusOne) {
   // Positions are checked against each picture, so they fail per file.
   expect_refused({"apply", "lighten", "--cx", "23", in, out}, 1,
                  "--cx 23 is out of range 0..22 for a 23x17 image");
+  expect_refused({"apply", "input-levels", "--low", "90", "--high", "90", in, out}, 1,
+                 "input-levels: --high must be above --low");
   // The library refuses a mirror whose side does not belong to its axis.
   expect_refused({"apply", "mirror", "--mode", "keep-top", in, out}, 1,
                  "keep-top and keep-bottom with --axis vertical");
@@ -602,6 +638,23 @@ TEST_F(Tool, GalleryWritesEveryPictureTheSheetAndTheIndex) {
       {"yellow-glow", applyYellowglow},
       {"sepia",
        [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { fx_apply_sepia(a, b, w, h); }},
+      {"vignette", fx_apply_vignette},
+      {"vignette-preview", fx_apply_vignette_prev},
+      {"vintage", applyVintage},
+      {"vintage-preview", fx_apply_vintage_prev},
+      {"old-photo", applyOldPhoto},
+      {"old-photo-texture",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+         fx_apply_oldphoto_texture(a, b, fxtool::paper_texture(w, h).pixels.data(), w, h);
+       }},
+      {"pop-art", applyPopArt},
+      {"pop-art-preview", fx_apply_popart_prev},
+      {"soft-glow-level-50",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { applySoftglow(a, b, w, h, 50); }},
+      {"output-levels-low-40-high-215",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+         changeHistogramByOutput(a, b, w, h, 0, 40, 215);
+       }},
       {"pixelize-shift-3",
        [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { applyPixelize(a, b, w, h, 3); }},
       {"pixelize-brush", [](const uint32_t*, uint32_t* b, int32_t w,

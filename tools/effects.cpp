@@ -5,6 +5,7 @@
 
 #include "photofx.h"
 #include "tools/effect.h"
+#include "tools/texture.h"
 
 namespace fxtool {
 namespace {
@@ -63,6 +64,29 @@ std::string mirror(const Call& c) {
            "horizontal, keep-top and keep-bottom with --axis vertical)";
   }
   return result_code(code);
+}
+
+constexpr Choice kChannels[] = {{"all", 0}, {"red", 1}, {"green", 2}, {"blue", 3}};
+
+// Input and output levels write nothing when high is not above low; the tool says so rather
+// than hand back the picture unchanged.
+template <auto Levels>
+std::string levels(const Call& c) {
+  if (c.arg(2) <= c.arg(1)) return "--high must be above --low";
+  return full_only<Levels>(c);
+}
+
+// The textured old photo mixes in a texture of the picture's size: the tool's own paper.
+std::string old_photo_texture(const Call& c) {
+  const Image paper = paper_texture(c.width(), c.height());
+  const Bounds& b = c.bounds;
+  if (c.whole) {
+    fx_apply_oldphoto_texture(c.src(), c.dst(), paper.pixels.data(), c.width(), c.height());
+  } else {
+    fx_apply_oldphoto_texture_partial(c.src(), c.dst(), paper.pixels.data(), c.mask, c.width(),
+                                      c.height(), b.left, b.right, b.top, b.bottom);
+  }
+  return {};
 }
 
 // Sphericity and twirl warp the selection's box (or the whole image) and take one more
@@ -271,6 +295,37 @@ constexpr Effect kEffects[] = {
      },
      .gallery = ""},
 
+    // ---- Tone curves ----------------------------------------------------------------------------
+    {.name = "gamma",
+     .family = "curves",
+     .summary = "mid-tones lighter above 1, darker below; black and white stay",
+     .selects = Selects::kByTool,
+     .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
+                real("gamma", 0.1, 10, 1, "the curve's power is 1 / gamma; 1 changes nothing")},
+     .run = [](const Call& c) {
+       control_gamma(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.real(1));
+       return std::string();
+     },
+     .gallery = "gamma=0.6;gamma=1.8;channel=blue,gamma=2.5"},
+    {.name = "input-levels",
+     .family = "curves",
+     .summary = "stretches low..high over the whole range: more contrast, the ends clipped",
+     .selects = Selects::kByTool,
+     .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
+                integer("low", 0, 255, 0, "the value that becomes 0"),
+                integer("high", 0, 255, 255, "the value that becomes 255; above low")},
+     .run = levels<changeHistogramByInput>,
+     .gallery = "low=40,high=215"},
+    {.name = "output-levels",
+     .family = "curves",
+     .summary = "squeezes the whole range into low..high: less contrast",
+     .selects = Selects::kByTool,
+     .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
+                integer("low", 0, 255, 0, "what 0 becomes"),
+                integer("high", 0, 255, 255, "what 255 becomes; above low")},
+     .run = levels<changeHistogramByOutput>,
+     .gallery = "low=40,high=215"},
+
     // ---- Looks ----------------------------------------------------------------------------------
     {.name = "greyscale",
      .family = "looks",
@@ -286,6 +341,69 @@ constexpr Effect kEffects[] = {
      .params = {},
      .run = full_and_partial<fx_apply_sepia, fx_apply_sepia_partial>,
      .gallery = ""},
+    {.name = "vignette",
+     .family = "looks",
+     .summary = "darkens toward the borders: to 9/16 at their middles, about 1/8 in the corners",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_vignette>,
+     .gallery = ""},
+    {.name = "vignette-preview",
+     .family = "looks",
+     .summary = "the table-based vignette for previews: steeper, about 0 in the corners",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_vignette_prev>,
+     .gallery = ""},
+    {.name = "vintage",
+     .family = "looks",
+     .summary = "faded warm film: tone curves, brightness and contrast, then a vignette",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyVintage, applyVintagePartial>,
+     .gallery = ""},
+    {.name = "vintage-preview",
+     .family = "looks",
+     .summary = "a one-pass stand-in for the vintage look, for previews",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_vintage_prev>,
+     .gallery = ""},
+    {.name = "old-photo",
+     .family = "looks",
+     .summary = "sepia with flattened contrast and a vignette",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyOldPhoto, applyOldPhotoPartial>,
+     .gallery = ""},
+    {.name = "old-photo-texture",
+     .family = "looks",
+     .summary = "a warm tone with a quarter of a paper texture mixed in",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = old_photo_texture,
+     .gallery = ""},
+    {.name = "pop-art",
+     .family = "looks",
+     .summary = "four half-size copies, each posterised in its own colours",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<applyPopArt>,
+     .gallery = ""},
+    {.name = "pop-art-preview",
+     .family = "looks",
+     .summary = "four half-size copies, each turned to its own hue, for previews",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_popart_prev>,
+     .gallery = ""},
+    {.name = "soft-glow",
+     .family = "looks",
+     .summary = "a slight blur, bright tones lifted and dark ones lowered",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 100, 50, "strength of the tone curve; 0 only blurs")},
+     .run = full_and_partial<applySoftglow, applySoftglowPartial>,
+     .gallery = "level=50;level=100"},
     {.name = "retro",
      .family = "looks",
      .summary = "preset: faded, slightly bright and desaturated",
