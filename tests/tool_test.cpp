@@ -626,8 +626,9 @@ TEST_F(Tool, GalleryWritesEveryPictureTheSheetAndTheIndex) {
   }
   EXPECT_EQ(written, files);
 
-  // Pictures at the defaults, straight from the library: the looks' full variants, and the
-  // brushes, whose defaults are the middle of the picture and a quarter of its longer side.
+  // Whole-picture runs, checked here rather than in runs of their own: the full variants of
+  // the looks and of sharpen, and the brushes at their defaults (the middle of the picture, a
+  // radius of a quarter of its longer side).
   using Full = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t);
   const std::vector<std::pair<std::string, Full>> plain = {
       {"retro", applyRetro},
@@ -655,6 +656,8 @@ TEST_F(Tool, GalleryWritesEveryPictureTheSheetAndTheIndex) {
        [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
          changeHistogramByOutput(a, b, w, h, 0, 40, 215);
        }},
+      {"sharpen", [](const uint32_t* a, uint32_t* b, int32_t w,
+                     int32_t h) { fx_apply_sharpen_all(a, b, w, h); }},
       {"pixelize-shift-3",
        [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { applyPixelize(a, b, w, h, 3); }},
       {"pixelize-brush", [](const uint32_t*, uint32_t* b, int32_t w,

@@ -255,10 +255,15 @@ constexpr Effect kEffects[] = {
      .summary = "crisper vertical edges: each pixel pushed away from its left and right neighbours",
      .selects = Selects::kMask,
      .params = {},
+     // The partial variant takes a level it does not use; the full one has no entry point.
      .run = [](const Call& c) {
        const Bounds& b = c.bounds;
-       applySharpen(c.src(), c.mask, c.dst(), c.width(), c.height(), 0, b.left, b.right, b.top,
-                    b.bottom);
+       if (c.whole) {
+         fx_apply_sharpen_all(c.src(), c.dst(), c.width(), c.height());
+       } else {
+         applySharpen(c.src(), c.mask, c.dst(), c.width(), c.height(), 0, b.left, b.right, b.top,
+                      b.bottom);
+       }
        return std::string();
      },
      .gallery = ""},
