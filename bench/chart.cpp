@@ -1,9 +1,9 @@
 // Draws the report's bar chart: each benchmark's time as a multiple of memcpy of the same image,
 // on a logarithmic axis, coloured by whether it meets its goal, with the goal marked.
 //
-//   photofx_chart SPEC OUT.png
+//   photofx_chart BARS OUT.png
 //
-// SPEC is tab-separated text written by bench/report, one item per line:
+// BARS is tab-separated text written by bench/report, one item per line:
 //   title <tab> TEXT
 //   panel <tab> TEXT                        starts a new column of bars
 //   bar <tab> LABEL <tab> X <tab> GOAL <tab> KIND
@@ -87,7 +87,7 @@ struct Axis {
   }
 };
 
-bool read_spec(const char* path, std::string& title, std::vector<Panel>& panels) {
+bool read_bars(const char* path, std::string& title, std::vector<Panel>& panels) {
   std::ifstream in(path);
   if (!in) return false;
   std::string line;
@@ -141,12 +141,12 @@ void draw_legend(Image& img, int32_t x, int32_t y) {
 
 int main(int argc, char** argv) {
   if (argc != 3) {
-    std::fprintf(stderr, "usage: photofx_chart SPEC OUT.png\n");
+    std::fprintf(stderr, "usage: photofx_chart BARS OUT.png\n");
     return 2;
   }
   std::string title;
   std::vector<Panel> panels;
-  if (!read_spec(argv[1], title, panels) || panels.empty()) return 1;
+  if (!read_bars(argv[1], title, panels) || panels.empty()) return 1;
 
   Axis axis;
   size_t rows = 0, label_chars = 0;

@@ -156,9 +156,9 @@ class Results(unittest.TestCase):
                         bench("a/full/12mp", 15, "goal=memcpy*2"),
                         bench("a/partial/12mp", 40, ""),
                         bench("b/full/12mp", 50, "goal=memcpy*2")])
-        spec = report.chart_spec(list(rows.values()), "T").splitlines()
-        self.assertEqual(spec[:2], ["title\tT", "panel\t" + report.SIZES["12mp"]])
-        self.assertEqual(spec[2:], ["bar\tmemcpy\t1\t0\treference",
+        bars = report.chart_bars(list(rows.values()), "T").splitlines()
+        self.assertEqual(bars[:2], ["title\tT", "panel\t" + report.SIZES["12mp"]])
+        self.assertEqual(bars[2:], ["bar\tmemcpy\t1\t0\treference",
                                     "bar\ta\t1.5\t2\tmet",
                                     "bar\ta partial\t4\t0\tnone",
                                     "bar\tb\t5\t2\tmissed"])
@@ -168,12 +168,12 @@ class Results(unittest.TestCase):
 class Chart(unittest.TestCase):
     GREEN, RED, INK = (0x2E, 0x9E, 0x4F), (0xD6, 0x45, 0x2F), (0x20, 0x20, 0x20)
 
-    def draw(self, spec):
+    def draw(self, bars):
         with tempfile.TemporaryDirectory() as d:
-            spec_path, out = os.path.join(d, "c.chart"), os.path.join(d, "c.png")
-            with open(spec_path, "w") as f:
-                f.write(spec)
-            subprocess.run([os.environ["PHOTOFX_CHART"], spec_path, out], check=True)
+            bars_path, out = os.path.join(d, "c.chart"), os.path.join(d, "c.png")
+            with open(bars_path, "w") as f:
+                f.write(bars)
+            subprocess.run([os.environ["PHOTOFX_CHART"], bars_path, out], check=True)
             width, _, bpp, rows = png.read_png(out)
         return [[tuple(r[x * bpp:x * bpp + 3]) for x in range(width)] for r in rows]
 
