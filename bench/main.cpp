@@ -190,8 +190,8 @@ std::string goal_label(const Goal& g) {
   std::string s;
   if (g.base != Base::kNone) {
     char buf[64];
-    std::snprintf(buf, sizeof buf, "goal=%s*%g%s", g.base == Base::kMemcpy ? "memcpy" : "peer",
-                  g.factor, g.photo_only ? "@12mp" : "");
+    std::snprintf(buf, sizeof buf, "goal=%s*%g", g.base == Base::kMemcpy ? "memcpy" : "peer",
+                  g.factor);
     s = buf;
   }
   if (g.max_scratch > 0) {
