@@ -115,17 +115,28 @@ struct Images {
   std::vector<uint32_t> src_before;
   std::vector<uint8_t> mask_before;
 
+  // Pixels and mask bytes drawn from the input; an image larger than kTile pixels repeats its
+  // first kTile, so that a short input still fills a large image with varied content.
+  static constexpr size_t kTile = 1024;
+
   explicit Images(FuzzedDataProvider& in, int32_t max_side = 24)
-      : size(pick_size(in, max_side)),
-        src(size.pixels, 0x5EC0DE5Eu),
-        dst(size.pixels, 0xD5D5D5D5u),
-        mask(size.pixels, 0x3C) {
+      : Images(in, pick_size(in, max_side)) {}
+
+  Images(FuzzedDataProvider& in, Size s)
+      : size(s), src(s.pixels, 0x5EC0DE5Eu), dst(s.pixels, 0xD5D5D5D5u), mask(s.pixels, 0x3C) {
     null_src = in.ConsumeIntegralInRange<int>(0, 31) == 0;
     null_dst = in.ConsumeIntegralInRange<int>(0, 31) == 0;
     null_mask = in.ConsumeIntegralInRange<int>(0, 15) == 0;
-    src.fill(in);
+    const size_t n = size.pixels;
+    for (size_t i = 0; i < n; ++i) {
+      src.data()[i] = i < kTile ? in.ConsumeIntegral<uint32_t>() : src.data()[i % kTile];
+    }
     // Mostly 0 and 1, so that selections are neither empty nor everything.
-    for (size_t i = 0; i < mask.size(); ++i) {
+    for (size_t i = 0; i < n; ++i) {
+      if (i >= kTile) {
+        mask.data()[i] = mask.data()[i % kTile];
+        continue;
+      }
       const uint8_t b = in.ConsumeIntegral<uint8_t>();
       mask.data()[i] = b < 100 ? 0 : (b < 230 ? 1 : b);
     }
