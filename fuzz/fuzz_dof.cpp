@@ -87,8 +87,7 @@ Band pick_band(FuzzedDataProvider& in, int32_t height) {
 }
 
 bool refused(const Images& im, bool needs_mask) {
-  return im.null_src || im.null_dst || (needs_mask && im.null_mask) ||
-         pfx::pixel_count(im.size.width, im.size.height) == 0 || too_large(im.size);
+  return im.null_src || im.null_dst || (needs_mask && im.null_mask) || nothing_to_do(im.size);
 }
 
 bool keeps_alpha(const std::vector<uint32_t>& out, const std::vector<uint32_t>& src) {
@@ -230,8 +229,7 @@ void scale_down(FuzzedDataProvider& in) {
   scale_down_depth(im.m(), im.size.width, im.size.height, depth, w.size.width, w.size.height);
   im.check();
   FUZZ_CHECK(w.image.guards_intact() && w.depth.guards_intact());
-  const bool none =
-      pfx::pixel_count(im.size.width, im.size.height) == 0 || too_large(im.size) || !w.affordable;
+  const bool none = nothing_to_do(im.size) || !w.affordable;
   if (none || im.null_src || out == nullptr) FUZZ_CHECK(w.image.contents() == image_before);
   if (none || im.null_mask || depth == nullptr) FUZZ_CHECK(w.depth.contents() == depth_before);
   if (!none && out != nullptr && !im.null_src) {
@@ -379,8 +377,7 @@ void init_blur(FuzzedDataProvider& in, Workspace& ws, Photos& photos) {
   fx_Init_blur(im.s(), im.m(), im.size.width, im.size.height, b.left, b.right, b.top, b.bottom);
   const bool failed = struck(fail);
   im.check();
-  const bool bad = im.null_src || (im.null_mask && !every_pixel) ||
-                   pfx::pixel_count(im.size.width, im.size.height) == 0 || too_large(im.size);
+  const bool bad = im.null_src || (im.null_mask && !every_pixel) || nothing_to_do(im.size);
   if (bad || failed) {
     ws = {};
     FUZZ_CHECK(g_ssrc == nullptr && g_sblur == nullptr && g_tempd == nullptr);
@@ -404,8 +401,7 @@ void init_tilt(FuzzedDataProvider& in, Workspace& ws, Photos& photos) {
   const bool failed = struck(fail);
   im.check();
   FUZZ_CHECK(all == all_before);
-  const bool bad =
-      im.null_src || pfx::pixel_count(im.size.width, im.size.height) == 0 || too_large(im.size);
+  const bool bad = im.null_src || nothing_to_do(im.size);
   if (bad || failed) {
     ws = {};
     FUZZ_CHECK(g_ssrc == nullptr && g_sblur == nullptr && g_tempd == nullptr);

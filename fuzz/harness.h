@@ -66,12 +66,15 @@ struct Size {
 };
 
 // Mostly small images, sometimes empty or negative, sometimes a size whose pixel count no
-// library buffer could hold (the library must refuse it without touching the small buffer).
+// library buffer could hold or a side at the negative end of 32 bits (the library must refuse
+// either without touching the small buffer it is given).
 inline Size pick_size(FuzzedDataProvider& in, int32_t max_side = 24) {
   if (in.ConsumeIntegralInRange<int>(0, 15) == 0) {
-    static constexpr int32_t kHuge[][2] = {
-        {65536, 65536}, {INT32_MAX, 2}, {2, INT32_MAX}, {46341, 46341}, {INT32_MAX, INT32_MAX}};
-    const auto& s = kHuge[in.ConsumeIntegralInRange<size_t>(0, 4)];
+    static constexpr int32_t kExtreme[][2] = {
+        {65536, 65536},         {INT32_MAX, 2},        {2, INT32_MAX}, {46341, 46341},
+        {INT32_MAX, INT32_MAX}, {INT32_MIN, 3},        {3, INT32_MIN}, {INT32_MIN, INT32_MIN},
+        {-65536, 65536},        {INT32_MIN, INT32_MAX}};
+    const auto& s = kExtreme[in.ConsumeIntegralInRange<size_t>(0, 9)];
     return {s[0], s[1], 16};
   }
   const int32_t w = in.ConsumeIntegralInRange<int32_t>(-2, max_side);
@@ -183,6 +186,11 @@ namespace pfx::fuzz {
 
 inline bool too_large(const Size& s) { return pixel_count(s.width, s.height) > kMaxPixels; }
 
+// An image with no pixel to visit, or one too large to address: a call writes nothing.
+inline bool nothing_to_do(const Size& s) {
+  return pixel_count(s.width, s.height) == 0 || too_large(s);
+}
+
 // Calls fn(src, dst, w, h, extra...) as a full variant, into dst or in place, and checks the
 // buffers. `refused` says whether the call must have written nothing.
 template <class Call>
@@ -197,7 +205,7 @@ void full_variant(FuzzedDataProvider& in, Call call) {
     return;
   }
   call(im.s(), im.d(), im.size, in);
-  if (im.null_src || im.null_dst || too_large(im.size)) {
+  if (im.null_src || im.null_dst || nothing_to_do(im.size)) {
     im.check_untouched(before);
   } else {
     im.check();
@@ -211,7 +219,7 @@ void partial_variant(FuzzedDataProvider& in, Call call) {
   const Rect b = pick_bounds(in, im.size);
   const std::vector<uint32_t> before = im.dst.contents();
   call(im.s(), im.m(), im.d(), im.size, b, in);
-  if (im.null_src || im.null_dst || (is_region(b) && im.null_mask) || too_large(im.size)) {
+  if (im.null_src || im.null_dst || (is_region(b) && im.null_mask) || nothing_to_do(im.size)) {
     im.check_untouched(before);
   } else {
     im.check();
