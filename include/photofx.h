@@ -382,6 +382,103 @@ PHOTOFX_API int32_t fx_apply_sepia_partial(const uint32_t* src, const uint8_t* m
 PHOTOFX_API int32_t fx_get_sepia_r(int32_t value); /* red curve; values outside 0..255 as given */
 PHOTOFX_API int32_t fx_get_sepia_b(int32_t value); /* blue curve; values outside 0..255 as given */
 
+/* ---- Tone curves: channel selector 0 all colour channels, 1 red, 2 green, 3 blue ----------
+ * Any other selector copies the pixels unchanged. Alpha is kept; dst may be src. */
+
+/* Each selected channel c becomes 255 (c / 255)^(1 / gamma), rounded half up. Gammas that are
+ * zero, negative or NaN still give a curve within 0..255. */
+PHOTOFX_API void control_gamma(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t channel, double gamma);
+/* Stretches low..high to 0..255; high <= low writes nothing. */
+PHOTOFX_API void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width,
+                                        int32_t height, int32_t channel, int32_t low, int32_t high);
+/* Squeezes 0..255 into low..high; high <= low writes nothing. */
+PHOTOFX_API void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width,
+                                         int32_t height, int32_t channel, int32_t low,
+                                         int32_t high);
+
+/* ---- Vignette: darkens toward the borders around (width >> 1, height >> 1); dst may be src - */
+
+/* floor(2^24 / k^2), entry 0 equal to entry 1; larger previews use the same rule beyond 255. */
+PHOTOFX_API extern const int32_t LUT_VIGNETTE[256];
+/* To 9/16 at the middle of each border, about 1/8 in the corners. An image narrower or lower
+ * than 2 pixels comes out as its source. */
+PHOTOFX_API void fx_apply_vignette(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+/* Table-based and steeper: 1/2 at the middle of each border, about 0 in the corners. */
+PHOTOFX_API void fx_apply_vignette_prev(const uint32_t* src, uint32_t* dst, int32_t width,
+                                        int32_t height);
+
+/* ---- Vintage: faded warm film look ending in the vignette ---------------------------------- */
+
+PHOTOFX_API extern const int32_t LUT_VINTAGE[256]; /* the preview's S-shaped tone curve */
+PHOTOFX_API void applyVintage(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyVintagePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                     int32_t width, int32_t height, int32_t left, int32_t right,
+                                     int32_t top, int32_t bottom);
+/* The full look, 22 passes; dst may be src. */
+PHOTOFX_API void fx_apply_vintage(const uint32_t* src, uint32_t* dst, int32_t width,
+                                  int32_t height);
+/* The full look at the selected pixels inside the bounds, the source at the others there; dst
+ * outside the bounds is not written. Empty bounds give the full look everywhere. */
+PHOTOFX_API void fx_apply_vintage_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                          int32_t width, int32_t height, int32_t left,
+                                          int32_t right, int32_t top, int32_t bottom);
+/* One-pass stand-in for previews: tone table, green lift, blue cut, table vignette. */
+PHOTOFX_API void fx_apply_vintage_prev(const uint32_t* src, uint32_t* dst, int32_t width,
+                                       int32_t height);
+
+/* ---- Old photo: sepia, flattened contrast and vignette; or a warm tone with a texture ------ */
+
+/* (v - 128) / 10 rounded away from zero; each channel moves twice this toward 128. */
+PHOTOFX_API extern const int32_t LUT_OLDPHOTO[256];
+PHOTOFX_API void applyOldPhoto(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+PHOTOFX_API void applyOldPhotoPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t left, int32_t right,
+                                      int32_t top, int32_t bottom);
+/* The plain look; dst may be src. */
+PHOTOFX_API void fx_apply_oldphoto(const uint32_t* src, uint32_t* dst, int32_t width,
+                                   int32_t height);
+/* Valid bounds only switch the mask on: every pixel of the image with mask byte 1 gets the
+ * look, every other pixel the source. Empty bounds: the look everywhere. dst may be src. */
+PHOTOFX_API void fx_apply_oldphoto_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                           int32_t width, int32_t height, int32_t left,
+                                           int32_t right, int32_t top, int32_t bottom);
+/* Colour tone at hue 14, then a quarter of the texture mixed in; fully transparent pixels keep
+ * the toned colour unmixed. dst may be src or texture. */
+PHOTOFX_API void fx_apply_oldphoto_texture(const uint32_t* src, uint32_t* dst,
+                                           const uint32_t* texture, int32_t width, int32_t height);
+/* Writes the textured look at the selected pixels inside the bounds and nothing else; empty
+ * bounds write it everywhere. Note the order: dst and texture come before the mask. */
+PHOTOFX_API void fx_apply_oldphoto_texture_partial(const uint32_t* src, uint32_t* dst,
+                                                   const uint32_t* texture, const uint8_t* mask,
+                                                   int32_t width, int32_t height, int32_t left,
+                                                   int32_t right, int32_t top, int32_t bottom);
+
+/* ---- Pop art: the half-size image in four quadrants, each in its own colours; dst may be src */
+
+PHOTOFX_API void applyPopArt(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+/* Posterised by brightness into a dark and a light colour per quadrant. */
+PHOTOFX_API void fx_apply_popart(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height);
+/* Value kept, saturation raised, hue 45, 300, 180 and 90 degrees by quadrant. */
+PHOTOFX_API void fx_apply_popart_prev(const uint32_t* src, uint32_t* dst, int32_t width,
+                                      int32_t height);
+
+/* ---- Soft glow: slight blur, bright tones lifted by level 0..100; fx_ return a code --------
+ * Levels outside 0..100 and null buffers are refused with nothing written. dst may be src; the
+ * in-place call needs two rows of scratch and returns PHOTOFX_OUT_OF_MEMORY without them. */
+
+PHOTOFX_API void applySoftglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               int32_t level);
+PHOTOFX_API void applySoftglowPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                      int32_t width, int32_t height, int32_t level, int32_t left,
+                                      int32_t right, int32_t top, int32_t bottom);
+PHOTOFX_API int32_t fx_softglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                                int32_t level);
+PHOTOFX_API int32_t fx_softglow_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                        int32_t width, int32_t height, int32_t level, int32_t left,
+                                        int32_t right, int32_t top, int32_t bottom);
+
 /* ---- Warps: bilinear sampling and fast arctangent ------------------------------------------
  * Bilinear weights run 0..2048 (2048 = a whole pixel). Warp angles are degrees with 19 fraction
  * bits: 0x2D00000 is 90 degrees, 0xB400000 a full turn. */

@@ -1,0 +1,136 @@
+// Pop art: a two-by-two poster.
+//
+// The image is shrunk to half size (every second pixel of every second row) and repeated in the
+// four quadrants, each recoloured with its own palette. The full look posterises by brightness:
+// a dark colour up to 107, a light colour from 124, and two short ramps between them. The
+// preview keeps each pixel's value, raises its saturation a little and paints it in a fixed hue
+// per quadrant. For odd sizes the left and top quadrants are one pixel wider or taller.
+#include <cstddef>
+#include <cstdint>
+
+#include "frame/frame.h"
+#include "frame/hsv.h"
+#include "frame/pixel.h"
+#include "photofx.h"
+
+namespace pfx {
+namespace {
+
+enum Quadrant { kTopLeft, kTopRight, kBottomLeft, kBottomRight };
+
+struct Colour {
+  int32_t r, g, b;
+};
+
+// Dark colour (brightness up to 107), end of the lower ramp (115), start of the upper ramp and
+// light colour (124 and up). Only the top-right palette starts its upper ramp from a colour
+// other than where the lower one ended, so its green jumps between 115 and 116.
+struct Palette {
+  Colour dark, lower_end, upper_start, light;
+};
+
+constexpr Palette kPalettes[4] = {
+    {{23, 4, 158}, {254, 0, 26}, {254, 0, 26}, {254, 247, 17}},
+    {{4, 0, 17}, {111, 17, 226}, {111, 34, 226}, {131, 255, 192}},
+    {{11, 35, 1}, {193, 38, 10}, {193, 38, 10}, {242, 158, 243}},
+    {{131, 1, 3}, {56, 99, 194}, {56, 99, 194}, {245, 204, 18}},
+};
+
+// k eighths of the way from a to b, rounded down (never negative: k <= 8).
+constexpr int32_t ramp(int32_t a, int32_t b, int32_t k) { return (8 * a + k * (b - a)) >> 3; }
+
+constexpr Colour ramp(const Colour& a, const Colour& b, int32_t k) {
+  return {ramp(a.r, b.r, k), ramp(a.g, b.g, k), ramp(a.b, b.b, k)};
+}
+
+constexpr Colour palette_colour(const Palette& p, int32_t brightness) {
+  if (brightness >= 124) return p.light;
+  if (brightness >= 116) return ramp(p.upper_start, p.light, brightness - 115);
+  if (brightness >= 108) return ramp(p.dark, p.lower_end, brightness - 107);
+  return p.dark;
+}
+
+// The colour depends only on the brightness, so each quadrant's 256 colours are made once per
+// call.
+class Posterise {
+ public:
+  Posterise() : colour_{} {
+    for (int32_t q = 0; q < 4; ++q) {
+      for (int32_t l = 0; l < 256; ++l) {
+        const Colour c = palette_colour(kPalettes[q], l);
+        colour_[q][l] = pack(0, c.r, c.g, c.b);
+      }
+    }
+  }
+
+  uint32_t operator()(Quadrant q, uint32_t s) const {
+    const int32_t l = (77 * red_of(s) + 150 * green_of(s) + 29 * blue_of(s)) >> 8;
+    return alpha_bits(s) | colour_[q][l];
+  }
+
+ private:
+  uint32_t colour_[4][256];
+};
+
+constexpr int32_t kPreviewHue[4] = {45, 300, 180, 90};
+
+// Value kept, saturation raised by 10000 (held below full), hue fixed per quadrant.
+uint32_t preview_recolour(Quadrant q, uint32_t s) {
+  const Hsv hsv = rgb_to_hsv(red_of(s), green_of(s), blue_of(s));
+  const int32_t sat = hsv.s + 10000 > 65535 ? 65535 : hsv.s + 10000;
+  const Rgb c = hsv_to_rgb(kPreviewHue[q], sat, hsv.v);
+  return pack(s, c.r, c.g, c.b);
+}
+
+// The poster layout. The half-size copy is made into the top-left quadrant first and the other
+// three quadrants are recoloured from it before it is recoloured itself. Each write lands at or
+// before the source pixels still to be read, so dst may be the source.
+template <class Recolour>
+void poster(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+            const Recolour& recolour) {
+  const size_t w = static_cast<size_t>(width), h = static_cast<size_t>(height);
+  const size_t qw = (w >> 1) + (w & 1), qh = (h >> 1) + (h & 1);
+  for (size_t y = 0; y < qh; ++y) {
+    uint32_t* row = dst + y * w;
+    const uint32_t* from = src + 2 * y * w;
+    for (size_t x = 0; x < qw; ++x) row[x] = from[2 * x];
+    for (size_t x = qw; x < w; ++x) row[x] = recolour(kTopRight, row[x - qw]);
+  }
+  for (size_t y = qh; y < h; ++y) {
+    uint32_t* row = dst + y * w;
+    const uint32_t* copy = dst + (y - qh) * w;
+    for (size_t x = 0; x < qw; ++x) row[x] = recolour(kBottomLeft, copy[x]);
+    for (size_t x = qw; x < w; ++x) row[x] = recolour(kBottomRight, copy[x - qw]);
+  }
+  for (size_t y = 0; y < qh; ++y) {
+    uint32_t* row = dst + y * w;
+    for (size_t x = 0; x < qw; ++x) row[x] = recolour(kTopLeft, row[x]);
+  }
+}
+
+bool poster_args_ok(const uint32_t* src, const uint32_t* dst, int32_t width, int32_t height) {
+  if (src == nullptr || dst == nullptr) return false;
+  const int64_t n = pixel_count(width, height);
+  return n > 0 && n <= kMaxPixels;
+}
+
+}  // namespace
+}  // namespace pfx
+
+extern "C" {
+
+void fx_apply_popart(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  if (!pfx::poster_args_ok(src, dst, width, height)) return;
+  pfx::poster(src, dst, width, height, pfx::Posterise());
+}
+
+void fx_apply_popart_prev(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  if (!pfx::poster_args_ok(src, dst, width, height)) return;
+  pfx::poster(src, dst, width, height, pfx::preview_recolour);
+}
+
+void applyPopArt(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  fx_apply_popart(src, dst, width, height);
+}
+
+}  // extern "C"

@@ -1,0 +1,76 @@
+// Tone curves: gamma, input levels and output levels.
+//
+// Each maps the colour channels picked by a channel selector (0 all, 1 red, 2 green, 3 blue; any
+// other value picks none and the pixels are copied) through one monotone curve and keeps alpha.
+// Gamma raises each channel to the power 1 / gamma; input levels stretch low..high to 0..255;
+// output levels squeeze 0..255 into low..high. They are the building blocks of the vintage look,
+// which runs them in place.
+#include <cmath>
+#include <cstdint>
+
+#include "adjust/channel_map.h"
+#include "frame/frame.h"
+#include "frame/pixel.h"
+#include "photofx.h"
+
+namespace pfx {
+namespace {
+
+// The channels a selector picks get curve(c); the others keep c.
+template <class Curve>
+ChannelMap selected_channels(int32_t channel, const Curve& curve) {
+  const bool red = channel == 0 || channel == 1;
+  const bool green = channel == 0 || channel == 2;
+  const bool blue = channel == 0 || channel == 3;
+  return ChannelMap([&](int32_t c) { return red ? curve(c) : c; },
+                    [&](int32_t c) { return green ? curve(c) : c; },
+                    [&](int32_t c) { return blue ? curve(c) : c; });
+}
+
+// n / 255 to the power 1 / gamma, scaled back to 0..255 and rounded half up. The clamp is made in
+// double before the conversion, so a gamma of zero, a negative gamma or a NaN (whose products
+// may be infinite or NaN) still gives a byte: NaN reads as 0.
+int32_t gamma_entry(int32_t n, double gamma) {
+  const double t = std::pow(n / 255.0, 1.0 / gamma) * 255.0 + 0.5;
+  if (!(t >= 0.0)) return 0;
+  if (t >= 255.0) return 255;
+  return static_cast<int32_t>(t);
+}
+
+}  // namespace
+}  // namespace pfx
+
+extern "C" {
+
+void control_gamma(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                   int32_t channel, double gamma) {
+  if (src == nullptr || dst == nullptr) return;
+  int32_t curve[256];
+  for (int32_t n = 0; n < 256; ++n) curve[n] = pfx::gamma_entry(n, gamma);
+  pfx::for_each_pixel(src, dst, width, height,
+                      pfx::selected_channels(channel, [&](int32_t c) { return curve[c]; }));
+}
+
+// The level arithmetic is done in 64 bits: for 0 <= low < high <= 255 it gives the same values
+// as 32 bits, and any other pair of levels follows the same formulas without overflowing.
+void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                            int32_t channel, int32_t low, int32_t high) {
+  if (high <= low) return;  // no range to stretch; dst is left as it was
+  const int64_t scale = 261120 / (int64_t{high} - low);
+  pfx::for_each_pixel(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
+                        const int64_t v = (scale * (c - int64_t{low})) >> 10;
+                        return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
+                      }));
+}
+
+void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                             int32_t channel, int32_t low, int32_t high) {
+  if (high <= low) return;
+  const int64_t scale = (int64_t{high} - low) * 1024 / 255;
+  pfx::for_each_pixel(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
+                        const int64_t v = ((scale * c) >> 10) + low;
+                        return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
+                      }));
+}
+
+}  // extern "C"

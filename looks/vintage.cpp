@@ -1,0 +1,104 @@
+// Vintage: a faded, warm film look.
+//
+// The full look is a fixed chain of 22 passes: per-channel gamma and levels curves that crush
+// the blacks, warm the reds and lift the blue shadows, a touch of brightness and contrast, and
+// the vignette at the end. The first pass reads the source; every later one works in place on
+// the destination. The partial variant makes the full look into a scratch image and takes the
+// selected pixels from it. The preview is a one-pass stand-in for small images: one S-shaped
+// tone table, a green lift and a blue cut, and the table-based vignette weight.
+#include <cstdint>
+
+#include "frame/frame.h"
+#include "frame/pixel.h"
+#include "looks/preset.h"
+#include "looks/vignette.h"
+#include "photofx.h"
+
+namespace {
+
+constexpr int32_t kAll = 0, kRed = 1, kGreen = 2, kBlue = 3;
+
+// The look was tuned with these gammas held in single precision; widening them to double gives
+// the same curves as the decimal values would.
+constexpr double widened(float gamma) { return static_cast<double>(gamma); }
+
+}  // namespace
+
+extern "C" {
+
+// The S-shaped tone curve of the preview: shadows pushed down, mid-tones and highlights lifted.
+constinit const int32_t LUT_VINTAGE[256] = {
+    0,   0,   0,   0,   0,   0,   1,   1,   1,   1,   2,   2,   2,   3,   3,   3,    //
+    4,   4,   5,   5,   6,   6,   7,   7,   8,   8,   9,   9,   10,  11,  11,  12,   //
+    13,  14,  14,  15,  16,  17,  18,  18,  19,  20,  21,  22,  23,  24,  25,  26,   //
+    27,  28,  29,  30,  31,  32,  33,  34,  35,  36,  38,  39,  40,  41,  42,  44,   //
+    45,  46,  47,  49,  50,  51,  53,  54,  55,  57,  58,  60,  61,  62,  64,  65,   //
+    67,  68,  70,  72,  73,  75,  76,  78,  79,  81,  83,  84,  86,  88,  89,  91,   //
+    93,  95,  96,  98,  100, 102, 104, 105, 107, 109, 111, 112, 114, 116, 118, 119,  //
+    121, 123, 124, 126, 128, 129, 131, 133, 134, 136, 137, 139, 140, 142, 144, 145,  //
+    147, 148, 150, 151, 153, 154, 156, 157, 159, 160, 162, 163, 164, 166, 167, 169,  //
+    170, 171, 173, 174, 175, 177, 178, 179, 181, 182, 183, 185, 186, 187, 188, 190,  //
+    191, 192, 193, 194, 196, 197, 198, 199, 200, 201, 202, 204, 205, 206, 207, 208,  //
+    209, 210, 211, 212, 213, 214, 215, 216, 217, 218, 219, 220, 221, 222, 223, 223,  //
+    224, 225, 226, 227, 228, 229, 229, 230, 231, 232, 233, 233, 234, 235, 235, 236,  //
+    237, 238, 238, 239, 240, 240, 241, 241, 242, 243, 243, 244, 244, 245, 245, 246,  //
+    246, 247, 247, 248, 248, 249, 249, 250, 250, 250, 251, 251, 251, 252, 252, 252,  //
+    253, 253, 253, 253, 254, 254, 254, 254, 254, 255, 255, 255, 255, 255, 255, 255,  //
+};
+
+void fx_apply_vintage(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  // The later passes work on dst alone, so a refused first pass must stop the chain.
+  if (src == nullptr || dst == nullptr) return;
+  if (pfx::pixel_count(width, height) > pfx::kMaxPixels) return;
+  control_gamma(src, dst, width, height, kAll, 0.77);
+  changeHistogramByInput(dst, dst, width, height, kRed, 28, 255);
+  control_gamma(dst, dst, width, height, kRed, widened(1.09f));
+  control_gamma(dst, dst, width, height, kGreen, widened(1.06f));
+  control_gamma(dst, dst, width, height, kBlue, widened(1.15f));
+  changeHistogramByOutput(dst, dst, width, height, kBlue, 45, 255);
+  fx_control_brightness_all(dst, dst, width, height, 12);
+  fx_control_contrast_all(dst, dst, width, height, 12);
+  changeHistogramByInput(dst, dst, width, height, kAll, 15, 243);
+  control_gamma(dst, dst, width, height, kAll, widened(1.03f));
+  changeHistogramByOutput(dst, dst, width, height, kAll, 0, 238);
+  changeHistogramByInput(dst, dst, width, height, kRed, 49, 255);
+  control_gamma(dst, dst, width, height, kRed, widened(2.35f));
+  changeHistogramByOutput(dst, dst, width, height, kRed, 11, 232);
+  control_gamma(dst, dst, width, height, kGreen, widened(1.15f));
+  changeHistogramByOutput(dst, dst, width, height, kGreen, 0, 250);
+  control_gamma(dst, dst, width, height, kBlue, widened(0.58f));
+  changeHistogramByOutput(dst, dst, width, height, kBlue, 56, 238);
+  fx_control_contrast_all(dst, dst, width, height, 12);
+  changeHistogramByOutput(dst, dst, width, height, kBlue, 0, 241);
+  changeHistogramByOutput(dst, dst, width, height, kBlue, 14, 255);
+  fx_apply_vignette(dst, dst, width, height);
+}
+
+void fx_apply_vintage_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                              int32_t width, int32_t height, int32_t left, int32_t right,
+                              int32_t top, int32_t bottom) {
+  pfx::composite_preset(fx_apply_vintage, src, mask, dst, width, height,
+                        {left, right, top, bottom});
+}
+
+void fx_apply_vintage_prev(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  const pfx::PreviewVignette vignette(width, height);
+  pfx::for_each_pixel_at(src, dst, width, height, [&](uint32_t p, int32_t x, int32_t y) {
+    const int32_t weight = vignette.weight(x, y);
+    const int32_t r = LUT_VINTAGE[pfx::red_of(p)];
+    const int32_t g = pfx::clamp_to(LUT_VINTAGE[pfx::green_of(p)] + 8, 0, 255);
+    const int32_t b = pfx::clamp_to(LUT_VINTAGE[pfx::blue_of(p)] - 44, 0, 255);
+    return pfx::pack(p, (weight * r) >> 22, (weight * g) >> 22, (weight * b) >> 22);
+  });
+}
+
+void applyVintage(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  fx_apply_vintage(src, dst, width, height);
+}
+
+void applyVintagePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                         int32_t height, int32_t left, int32_t right, int32_t top, int32_t bottom) {
+  fx_apply_vintage_partial(src, mask, dst, width, height, left, right, top, bottom);
+}
+
+}  // extern "C"
