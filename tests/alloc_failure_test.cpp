@@ -101,6 +101,21 @@ int32_t partial_level(Buffers& b) {
   return kNoCode;
 }
 
+// Source and destination in one buffer: dst, whose starting content is then the image.
+template <auto Fn, int32_t Level>
+int32_t full_in_place(Buffers& b) {
+  return code_of([&] { return Fn(b.dst.data(), b.dst.data(), b.width, b.height, Level); });
+}
+
+template <auto Fn, int32_t Level>
+int32_t partial_in_place(Buffers& b) {
+  const pfx::Rect r = b.bounds;
+  return code_of([&] {
+    return Fn(b.dst.data(), b.mask.data(), b.dst.data(), b.width, b.height, Level, r.left, r.right,
+              r.top, r.bottom);
+  });
+}
+
 int32_t init_blur(Buffers& b) {
   const pfx::Rect r = b.bounds;
   fx_Init_blur(b.src.data(), b.mask.data(), b.width, b.height, r.left, r.right, r.top, r.bottom);
@@ -301,6 +316,32 @@ const Case kCases[] = {
      .whole = true,
      .degrades_from = 2,
      .degraded = downlight_without_auto_adjust},
+    // Film looks: vintage's preset compositing, and the two rows soft glow saves in place.
+    {.name = "fx_apply_vintage_partial",
+     .width = 23,
+     .height = 17,
+     .call = partial<fx_apply_vintage_partial>},
+    {.name = "applyVintagePartial",
+     .width = 23,
+     .height = 17,
+     .call = partial<applyVintagePartial>,
+     .whole = true},
+    {.name = "fx_softglow",
+     .width = 23,
+     .height = 17,
+     .call = full_in_place<fx_softglow, 60>,
+     .out_of_memory = PHOTOFX_OUT_OF_MEMORY},
+    {.name = "applySoftglow", .width = 23, .height = 17, .call = full_in_place<applySoftglow, 80>},
+    {.name = "fx_softglow_partial",
+     .width = 23,
+     .height = 17,
+     .call = partial_in_place<fx_softglow_partial, 60>,
+     .out_of_memory = PHOTOFX_OUT_OF_MEMORY},
+    {.name = "applySoftglowPartial",
+     .width = 23,
+     .height = 17,
+     .call = partial_in_place<applySoftglowPartial, 90>,
+     .whole = true},
     // Auto adjust, and downlight, which runs it as its second pass.
     {.name = "fx_process_hdr",
      .width = 150,

@@ -53,6 +53,9 @@ int32_t tilt(const uint32_t* s, uint32_t* d, int32_t w, int32_t h) {
   return kNoCode;
 }
 
+// The texture the textured old-photo looks mix in.
+const Pixels kTexture = pfx::test::random_image(kW, kH, 80);
+
 struct FullRow {
   const char* name;
   FullFn fn;
@@ -106,6 +109,30 @@ const FullRow kFull[] = {
     {"applyYellowglow", full<applyYellowglow>},
     {"fx_process_hdr", full<fx_process_hdr>},
     {"applyAutoAdjust", full<applyAutoAdjust>},
+    {"control_gamma",
+     [](const uint32_t* s, uint32_t* d, int32_t w, int32_t h) {
+       control_gamma(s, d, w, h, 0, 1.8);
+       return kNoCode;
+     }},
+    {"changeHistogramByInput", full<changeHistogramByInput, 1, 30, 200>},
+    {"changeHistogramByOutput", full<changeHistogramByOutput, 3, 40, 220>},
+    {"fx_apply_vignette", full<fx_apply_vignette>},
+    {"fx_apply_vignette_prev", full<fx_apply_vignette_prev>},
+    {"fx_apply_vintage", full<fx_apply_vintage>},
+    {"applyVintage", full<applyVintage>},
+    {"fx_apply_vintage_prev", full<fx_apply_vintage_prev>},
+    {"fx_apply_oldphoto", full<fx_apply_oldphoto>},
+    {"applyOldPhoto", full<applyOldPhoto>},
+    {"fx_apply_oldphoto_texture",
+     [](const uint32_t* s, uint32_t* d, int32_t w, int32_t h) {
+       fx_apply_oldphoto_texture(s, d, kTexture.data(), w, h);
+       return kNoCode;
+     }},
+    {"fx_apply_popart", full<fx_apply_popart>},
+    {"applyPopArt", full<applyPopArt>},
+    {"fx_apply_popart_prev", full<fx_apply_popart_prev>},
+    {"fx_softglow", full<fx_softglow, 60>},
+    {"applySoftglow", full<applySoftglow, 35>},
 };
 
 const PartialRow kPartial[] = {
@@ -146,6 +173,18 @@ const PartialRow kPartial[] = {
     {"applyNostalgiaPartial", partial<applyNostalgiaPartial>},
     {"fx_apply_yellowglow_partial", partial<fx_apply_yellowglow_partial>},
     {"applyYellowglowPartial", partial<applyYellowglowPartial>},
+    {"fx_apply_vintage_partial", partial<fx_apply_vintage_partial>},
+    {"applyVintagePartial", partial<applyVintagePartial>},
+    {"fx_apply_oldphoto_partial", partial<fx_apply_oldphoto_partial>},
+    {"applyOldPhotoPartial", partial<applyOldPhotoPartial>},
+    {"fx_apply_oldphoto_texture_partial",
+     [](const uint32_t* s, const uint8_t* m, uint32_t* d, int32_t w, int32_t h, Rect b) {
+       fx_apply_oldphoto_texture_partial(s, d, kTexture.data(), m, w, h, b.left, b.right, b.top,
+                                         b.bottom);
+       return kNoCode;
+     }},
+    {"fx_softglow_partial", partial<fx_softglow_partial, 60>},
+    {"applySoftglowPartial", partial<applySoftglowPartial, 35>},
 };
 
 // A refused call returns the invalid-argument code where it returns a code at all.
@@ -241,6 +280,19 @@ TEST(BadInput, FullVariantsInPlaceMatchTwoBuffers) {
     EXPECT_EQ(row.fn(in_place.data(), in_place.data(), kW, kH), code);
     EXPECT_EQ(in_place, dst);
   }
+}
+
+TEST(BadInput, TexturedLooksRefuseANullTexture) {
+  const Pixels img = pfx::test::random_image(kW, kH, 88);
+  const Mask mask = pfx::test::random_mask(kW, kH, 89);
+  const Pixels untouched(img.size(), kUntouched);
+  Pixels dst = untouched;
+  fx_apply_oldphoto_texture(img.data(), dst.data(), nullptr, kW, kH);
+  for (Rect b : {kMasked, kWhole}) {
+    fx_apply_oldphoto_texture_partial(img.data(), dst.data(), nullptr, mask.data(), kW, kH, b.left,
+                                      b.right, b.top, b.bottom);
+  }
+  EXPECT_EQ(dst, untouched);
 }
 
 // A centre at (0, 0) lies outside an image with no columns or rows, however negative the size.
