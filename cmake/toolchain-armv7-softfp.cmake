@@ -12,7 +12,10 @@ set(PHOTOFX_ARM_SYSROOT /usr/${PHOTOFX_ARM_TRIPLE})
 
 set(CMAKE_C_COMPILER ${PHOTOFX_ARM_TRIPLE}-gcc)
 set(CMAKE_CXX_COMPILER ${PHOTOFX_ARM_TRIPLE}-g++)
-set(PHOTOFX_ARM_FLAGS "-march=armv7-a -mfpu=vfpv3-d16 -mfloat-abi=softfp")
+if(NOT DEFINED PHOTOFX_ARM_FPU)
+  set(PHOTOFX_ARM_FPU vfpv3-d16)
+endif()
+set(PHOTOFX_ARM_FLAGS "-march=armv7-a -mfpu=${PHOTOFX_ARM_FPU} -mfloat-abi=softfp")
 set(CMAKE_C_FLAGS_INIT "${PHOTOFX_ARM_FLAGS}")
 set(CMAKE_CXX_FLAGS_INIT "${PHOTOFX_ARM_FLAGS}")
 

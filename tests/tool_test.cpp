@@ -16,6 +16,7 @@
 #include "support/files.h"
 #include "support/images.h"
 #include "tools/image.h"
+#include "tools/texture.h"
 
 namespace {
 
@@ -261,6 +262,91 @@ TEST_F(Tool, EachEffectFamilyMatchesTheLibrary) {
          destroyTiltShift();
          return where(s, full, [](int32_t x, int32_t) { return x < 10; });
        }},
+      {{"sharpen", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           applySharpen(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 0, 3, 11, 2, 7);
+         });
+       }},
+      {{"greyscale", "--level", "14", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           controlGreyscalePartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 14, 3, 11, 2, 7);
+         });
+       }},
+      {{"sepia", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           fx_apply_sepia_partial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 3, 11, 2, 7);
+         });
+       }},
+      {{"gamma", "--channel", "green", "--gamma", "0.45"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           control_gamma(a, b, w, h, 2, 0.45);
+         });
+       }},
+      {{"input-levels", "--channel", "red", "--low", "30", "--high", "200", "--rect", "0,0,10,30"},
+       [](const Image& s) {
+         return where(s,
+                      lib(s, [](const uint32_t* a, uint32_t* b, int32_t w,
+                                int32_t h) { changeHistogramByInput(a, b, w, h, 1, 30, 200); }),
+                      [](int32_t x, int32_t) { return x < 10; });
+       }},
+      // The textured old photo writes only the selected pixels, over the tool's copy.
+      {{"old-photo-texture", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         const Image paper = fxtool::paper_texture(s.width, s.height);
+         Image o = s;
+         fx_apply_oldphoto_texture_partial(s.pixels.data(), o.pixels.data(), paper.pixels.data(),
+                                           rect_mask(3, 2, 11, 7).data(), s.width, s.height, 3, 11,
+                                           2, 7);
+         return o;
+       }},
+      {{"soft-glow", "--level", "80", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           applySoftglowPartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 80, 3, 11, 2, 7);
+         });
+       }},
+      // The other looks' full variants are checked against the gallery's pictures.
+      {{"sunshine", "--rect", "3,2,9,6"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           applySunshinePartial(a, rect_mask(3, 2, 11, 7).data(), b, w, h, 3, 11, 2, 7);
+         });
+       }},
+      // Mirror makes the picture the size the library names for it.
+      {{"mirror", "--mode", "keep-right", "--column", "5"},
+       [](const Image& s) {
+         Image o;
+         o.resize(getMirrorOutwidth(s.width, 5, MIRROR_KEEP_RIGHT, MIRROR_HORIZONTAL), s.height);
+         runMirror(s.pixels.data(), s.width, s.height, o.pixels.data(), o.width, o.height, 5,
+                   MIRROR_KEEP_RIGHT, MIRROR_HORIZONTAL);
+         return o;
+       }},
+      {{"mirror", "--axis", "vertical", "--mode", "keep-top", "--row", "3"},
+       [](const Image& s) {
+         Image o;
+         o.resize(s.width, getMirrorOutheight(s.height, 3, MIRROR_KEEP_TOP, MIRROR_VERTICAL));
+         runMirror(s.pixels.data(), s.width, s.height, o.pixels.data(), o.width, o.height, 3,
+                   MIRROR_KEEP_TOP, MIRROR_VERTICAL);
+         return o;
+       }},
+      // The warps take the selection's box as their window.
+      {{"sphericity", "--cx", "8", "--cy", "9", "--radius", "6", "--level", "-70", "--fast", "on",
+        "--rect", "2,3,15,12"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           runSphericity(a, b, w, h, 8, 9, 6, -70, 2, 16, 3, 14, 1);
+         });
+       }},
+      {{"twirl", "--cx", "12", "--cy", "8", "--radius", "9", "--angle", "200"},
+       [](const Image& s) {
+         return lib(s, [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+           runTwirl(a, b, w, h, 12, 8, 9, 200, 0, w - 1, 0, h - 1, 0);
+         });
+       }},
   };
   for (const Case& c : cases) {
     std::vector<std::string> args{"apply"};
@@ -431,6 +517,16 @@ TEST_F(Tool, BadCommandLinesAreRefusedWithStatusTwo) {
                  "two inputs would both be written to");
   expect_refused({"gallery", "--only", "brightness,sparkle", "-o", dir / "g"}, 2,
                  "unknown effect 'sparkle' in --only");
+  expect_refused({"apply", "twirl", "--fast", "yes", in, out}, 2,
+                 "--fast must be one of off, on, not 'yes'");
+  expect_refused({"apply", "sphericity", "--level", "-101", in, out}, 2,
+                 "--level -101 is out of range -100..100");
+  expect_refused({"apply", "gamma", "--gamma", "0.05", in, out}, 2,
+                 "--gamma 0.05 is out of range 0.1..10");
+  expect_refused({"apply", "gamma", "--gamma", "1,5", in, out}, 2,
+                 "--gamma needs a number, not '1,5'");
+  expect_refused({"apply", "mirror", "--rect", "1,1,4,4", in, out}, 2,
+                 "mirror takes no selection (it changes the image's size)");
 }
 
 TEST_F(Tool, UnusableFilesAreRefusedWithStatusOne) {
@@ -457,6 +553,11 @@ TEST_F(Tool, UnusableFilesAreRefusedWithStatusOne) {
   // Positions are checked against each picture, so they fail per file.
   expect_refused({"apply", "lighten", "--cx", "23", in, out}, 1,
                  "--cx 23 is out of range 0..22 for a 23x17 image");
+  expect_refused({"apply", "input-levels", "--low", "90", "--high", "90", in, out}, 1,
+                 "input-levels: --high must be above --low");
+  // The library refuses a mirror whose side does not belong to its axis.
+  expect_refused({"apply", "mirror", "--mode", "keep-top", in, out}, 1,
+                 "keep-top and keep-bottom with --axis vertical");
   expect_refused({"apply", "brightness", in, dir / "no-dir/out.png"}, 1,
                  "out.png: cannot write: No such file or directory");
   expect_refused({"gallery", dir / "missing.png", "-o", dir / "g"}, 1, "missing.png: cannot open");
@@ -525,10 +626,96 @@ TEST_F(Tool, GalleryWritesEveryPictureTheSheetAndTheIndex) {
   }
   EXPECT_EQ(written, files);
 
+  // Whole-picture runs, checked here rather than in runs of their own: the full variants of
+  // the looks and of sharpen, and the brushes at their defaults (the middle of the picture, a
+  // radius of a quarter of its longer side).
+  using Full = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t);
+  const std::vector<std::pair<std::string, Full>> plain = {
+      {"retro", applyRetro},
+      {"sunshine", applySunshine},
+      {"downlight", applyDownlight},
+      {"bluewash", applyBluewash},
+      {"nostalgia", applyNostalgia},
+      {"yellow-glow", applyYellowglow},
+      {"sepia",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { fx_apply_sepia(a, b, w, h); }},
+      {"vignette", fx_apply_vignette},
+      {"vignette-preview", fx_apply_vignette_prev},
+      {"vintage", applyVintage},
+      {"vintage-preview", fx_apply_vintage_prev},
+      {"old-photo", applyOldPhoto},
+      {"old-photo-texture",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+         fx_apply_oldphoto_texture(a, b, fxtool::paper_texture(w, h).pixels.data(), w, h);
+       }},
+      {"pop-art", applyPopArt},
+      {"pop-art-preview", fx_apply_popart_prev},
+      {"soft-glow-level-50",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { applySoftglow(a, b, w, h, 50); }},
+      {"output-levels-low-40-high-215",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) {
+         changeHistogramByOutput(a, b, w, h, 0, 40, 215);
+       }},
+      {"sharpen", [](const uint32_t* a, uint32_t* b, int32_t w,
+                     int32_t h) { fx_apply_sharpen_all(a, b, w, h); }},
+      {"pixelize-shift-3",
+       [](const uint32_t* a, uint32_t* b, int32_t w, int32_t h) { applyPixelize(a, b, w, h, 3); }},
+      {"pixelize-brush", [](const uint32_t*, uint32_t* b, int32_t w,
+                            int32_t h) { rubPixelize(b, w, h, 4, 11, 8, 5); }},
+      {"red-eye", [](const uint32_t*, uint32_t* b, int32_t w, int32_t h) {
+         removeRedeye(b, w, h, 11, 8, 5);
+       }}};
+  for (const auto& [name, full] : plain) {
+    const Image expected = lib(src, full);
+    EXPECT_NE(expected.pixels, src.pixels) << name;
+    EXPECT_EQ(decoded(dir / ("g/" + name + ".png")).pixels, expected.pixels) << name;
+  }
+
   // The contact sheet: tiles side by side, with captions drawn in the title colour.
   const Image sheet = decoded(dir / "g/contact-sheet.png");
   EXPECT_GE(sheet.width, 6 * 192);
   EXPECT_GT(std::count(sheet.pixels.begin(), sheet.pixels.end(), 0xFFE8E8E8u), 200);
+}
+
+// Auto adjust's parameters are module-wide, and the gallery runs every picture in one process:
+// a tuned auto adjust must not carry over into the downlight picture after it. Pictures under
+// 150 pixels a side never read the parameters, hence the larger input.
+TEST_F(Tool, AutoAdjustParametersReachTheLibraryAndStayWithTheirPicture) {
+  Image big;
+  big.width = 160;
+  big.height = 150;
+  big.pixels = pfx::test::random_image(big.width, big.height, 21);
+  ASSERT_EQ(fxtool::write_image(in, big), "");
+  const auto with_hdr = [&](int32_t cutoff, int32_t weight1, const std::function<void()>& call) {
+    fx_set_hdr(70, cutoff, weight1, 5120);
+    call();
+    fx_set_hdr(70, 100, 1000, 5120);
+  };
+
+  const Ran ran = tool({"gallery", in, "-o", dir / "g", "--only", "auto-adjust,downlight"});
+  ASSERT_EQ(ran.status, 0) << ran.err;
+  Image tuned = big, plain = big, downlight = big;
+  with_hdr(85, 4000,
+           [&] { applyAutoAdjust(big.pixels.data(), tuned.pixels.data(), big.width, big.height); });
+  applyAutoAdjust(big.pixels.data(), plain.pixels.data(), big.width, big.height);
+  applyDownlight(big.pixels.data(), downlight.pixels.data(), big.width, big.height);
+  ASSERT_NE(tuned.pixels, plain.pixels);
+  EXPECT_EQ(decoded(dir / "g/auto-adjust.png").pixels, plain.pixels);
+  EXPECT_EQ(decoded(dir / "g/auto-adjust-cutoff-85-weight1-4000.png").pixels, tuned.pixels);
+  EXPECT_EQ(decoded(dir / "g/downlight.png").pixels, downlight.pixels);
+
+  ASSERT_EQ(
+      tool({"apply", "downlight", "--cutoff", "60", "--rect", "20,10,100,120", in, out}).status, 0);
+  std::vector<uint8_t> mask(big.pixels.size(), 0);
+  for (int32_t y = 10; y < 130; ++y) {
+    std::fill_n(mask.begin() + y * big.width + 20, 100, uint8_t{1});
+  }
+  Image expected = big;
+  with_hdr(60, 1000, [&] {
+    applyDownlightPartial(big.pixels.data(), mask.data(), expected.pixels.data(), big.width,
+                          big.height, 20, 119, 10, 129);
+  });
+  EXPECT_EQ(decoded(out).pixels, expected.pixels);
 }
 
 TEST_F(Tool, GalleryWithoutInputUsesTheBundledPhotograph) {

@@ -5,9 +5,99 @@
 
 #include "photofx.h"
 #include "tools/effect.h"
+#include "tools/texture.h"
 
 namespace fxtool {
 namespace {
+
+// ---- Shared parameters and helpers ----------------------------------------------------------
+
+constexpr Choice kOffOn[] = {{"off", 0}, {"on", 1}};
+
+constexpr Choice kMirrorModes[] = {{"keep-left", MIRROR_KEEP_LEFT},
+                                   {"keep-right", MIRROR_KEEP_RIGHT},
+                                   {"keep-top", MIRROR_KEEP_TOP},
+                                   {"keep-bottom", MIRROR_KEEP_BOTTOM}};
+constexpr Choice kMirrorAxes[] = {{"horizontal", MIRROR_HORIZONTAL}, {"vertical", MIRROR_VERTICAL}};
+
+// The four auto-adjust parameters, in the order fx_set_hdr takes them.
+constexpr Param kThreshold =
+    integer("threshold", 0, 127, 70, "bright share (percent) at which weight2 replaces weight1");
+constexpr Param kCutOff =
+    integer("cutoff", 0, 100, 100, "lightness (percent) the brightest tone is mapped to");
+constexpr Param kWeight1 =
+    integer("weight1", 300, 8196, 1000, "evenness of the tone curve for most images");
+constexpr Param kWeight2 =
+    integer("weight2", 300, 8196, 5120, "the same for images that are mostly bright");
+
+// The auto-adjust parameters are module-wide. A run sets them from its own parameters k..k+3
+// and puts back what it found when it is done, so that every picture of a gallery (downlight
+// included) starts from the library's values rather than the previous picture's.
+class AutoAdjustSettings {
+ public:
+  AutoAdjustSettings(const Call& c, size_t k)
+      : threshold_(fx_get_threshold_hdr()),
+        cutoff_(fx_get_cutoff_hdr()),
+        weight1_(fx_get_weight1_hdr()),
+        weight2_(fx_get_weight2_hdr()) {
+    fx_set_hdr(c.arg(k), c.arg(k + 1), c.arg(k + 2), c.arg(k + 3));
+  }
+  ~AutoAdjustSettings() { fx_set_hdr(threshold_, cutoff_, weight1_, weight2_); }
+  AutoAdjustSettings(const AutoAdjustSettings&) = delete;
+  AutoAdjustSettings& operator=(const AutoAdjustSettings&) = delete;
+
+ private:
+  int32_t threshold_, cutoff_, weight1_, weight2_;
+};
+
+// Mirror: the library names the output size, the tool allocates it, the library fills it.
+std::string mirror(const Call& c) {
+  const int32_t mode = c.arg(2), axis = c.arg(3);
+  const int32_t pos = axis == MIRROR_HORIZONTAL ? c.arg(0) : c.arg(1);
+  const int32_t w = getMirrorOutwidth(c.width(), pos, mode, axis);
+  const int32_t h = getMirrorOutheight(c.height(), pos, mode, axis);
+  if (int64_t{w} * h > kMaxPixels) return "the mirrored image would be too large";
+  c.out.resize(w, h);
+  const int32_t code = runMirror(c.src(), c.width(), c.height(), c.dst(), w, h, pos, mode, axis);
+  if (code == PHOTOFX_INVALID_ARGUMENT) {
+    return "the library refused the arguments (keep-left and keep-right go with --axis "
+           "horizontal, keep-top and keep-bottom with --axis vertical)";
+  }
+  return result_code(code);
+}
+
+constexpr Choice kChannels[] = {{"all", 0}, {"red", 1}, {"green", 2}, {"blue", 3}};
+
+// Input and output levels write nothing when high is not above low; the tool says so rather
+// than hand back the picture unchanged.
+template <auto Levels>
+std::string levels(const Call& c) {
+  if (c.arg(2) <= c.arg(1)) return "--high must be above --low";
+  return full_only<Levels>(c);
+}
+
+// The textured old photo mixes in a texture of the picture's size: the tool's own paper.
+std::string old_photo_texture(const Call& c) {
+  const Image paper = paper_texture(c.width(), c.height());
+  const Bounds& b = c.bounds;
+  if (c.whole) {
+    fx_apply_oldphoto_texture(c.src(), c.dst(), paper.pixels.data(), c.width(), c.height());
+  } else {
+    fx_apply_oldphoto_texture_partial(c.src(), c.dst(), paper.pixels.data(), c.mask, c.width(),
+                                      c.height(), b.left, b.right, b.top, b.bottom);
+  }
+  return {};
+}
+
+// Sphericity and twirl warp the selection's box (or the whole image) and take one more
+// setting, the level or the angle, after the circle.
+template <auto Warp>
+std::string circle_warp(const Call& c) {
+  const Bounds& w = c.window;
+  Warp(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.arg(1), c.arg(2), c.arg(3), w.left,
+       w.right, w.top, w.bottom, static_cast<uint32_t>(c.arg(4)));
+  return {};
+}
 
 // clang-format off
 constexpr Effect kEffects[] = {
@@ -158,6 +248,260 @@ constexpr Effect kEffects[] = {
        return std::string();
      },
      .gallery = ""},
+
+    // ---- Retouching -----------------------------------------------------------------------------
+    {.name = "sharpen",
+     .family = "retouch",
+     .summary = "crisper vertical edges: each pixel pushed away from its left and right neighbours",
+     .selects = Selects::kMask,
+     .params = {},
+     // The partial variant takes a level it does not use; the full one has no entry point.
+     .run = [](const Call& c) {
+       const Bounds& b = c.bounds;
+       if (c.whole) {
+         fx_apply_sharpen_all(c.src(), c.dst(), c.width(), c.height());
+       } else {
+         applySharpen(c.src(), c.mask, c.dst(), c.width(), c.height(), 0, b.left, b.right, b.top,
+                      b.bottom);
+       }
+       return std::string();
+     },
+     .gallery = ""},
+    {.name = "pixelize",
+     .family = "retouch",
+     .summary = "a mosaic of square blocks, each the colour of its top-left pixel",
+     .selects = Selects::kByTool,
+     .params = {integer("shift", 0, 31, 3, "blocks of 2^shift pixels a side; 0 changes nothing")},
+     .run = full_only<applyPixelize>,
+     .gallery = "shift=3;shift=5"},
+    {.name = "pixelize-brush",
+     .family = "retouch",
+     .summary = "brush: the same mosaic inside a disc, on the grid of the whole picture",
+     .selects = Selects::kByTool,
+     .params = {integer("shift", 0, 31, 4, "blocks of 2^shift pixels a side; 0 changes nothing"),
+                column("cx", 500, "the disc's centre column"),
+                row("cy", 500, "the disc's centre row"),
+                length("radius", 0, 250, "the disc's radius in pixels")},
+     .run = [](const Call& c) {
+       rubPixelize(c.dst(), c.width(), c.height(), c.arg(0), c.arg(1), c.arg(2), c.arg(3));
+       return std::string();
+     },
+     .gallery = ""},
+    {.name = "red-eye",
+     .family = "retouch",
+     .summary = "takes the red out of strongly red pixels inside a square",
+     .selects = Selects::kByTool,
+     .params = {column("cx", 500, "the square's centre column"),
+                row("cy", 500, "the square's centre row"),
+                length("radius", 0, 250, "half the square's side in pixels")},
+     .run = [](const Call& c) {
+       removeRedeye(c.dst(), c.width(), c.height(), c.arg(0), c.arg(1), c.arg(2));
+       return std::string();
+     },
+     .gallery = ""},
+
+    // ---- Tone curves ----------------------------------------------------------------------------
+    {.name = "gamma",
+     .family = "curves",
+     .summary = "mid-tones lighter above 1, darker below; black and white stay",
+     .selects = Selects::kByTool,
+     .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
+                real("gamma", 0.1, 10, 1, "the curve's power is 1 / gamma; 1 changes nothing")},
+     .run = [](const Call& c) {
+       control_gamma(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.real(1));
+       return std::string();
+     },
+     .gallery = "gamma=0.6;gamma=1.8;channel=blue,gamma=2.5"},
+    {.name = "input-levels",
+     .family = "curves",
+     .summary = "stretches low..high over the whole range: more contrast, the ends clipped",
+     .selects = Selects::kByTool,
+     .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
+                integer("low", 0, 255, 0, "the value that becomes 0"),
+                integer("high", 0, 255, 255, "the value that becomes 255; above low")},
+     .run = levels<changeHistogramByInput>,
+     .gallery = "low=40,high=215"},
+    {.name = "output-levels",
+     .family = "curves",
+     .summary = "squeezes the whole range into low..high: less contrast",
+     .selects = Selects::kByTool,
+     .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
+                integer("low", 0, 255, 0, "what 0 becomes"),
+                integer("high", 0, 255, 255, "what 255 becomes; above low")},
+     .run = levels<changeHistogramByOutput>,
+     .gallery = "low=40,high=215"},
+
+    // ---- Looks ----------------------------------------------------------------------------------
+    {.name = "greyscale",
+     .family = "looks",
+     .summary = "grey from the mean of the channels, lighter above 10 and darker below",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 20, 10, "slider position; 10 keeps the grey's brightness")},
+     .run = full_and_partial<controlGreyscale, controlGreyscalePartial>,
+     .gallery = "level=5;level=10;level=15"},
+    {.name = "sepia",
+     .family = "looks",
+     .summary = "warm brown tones: red lifted and blue lowered, most in the mid-tones",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<fx_apply_sepia, fx_apply_sepia_partial>,
+     .gallery = ""},
+    {.name = "vignette",
+     .family = "looks",
+     .summary = "darkens toward the borders: to 9/16 at their middles, about 1/8 in the corners",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_vignette>,
+     .gallery = ""},
+    {.name = "vignette-preview",
+     .family = "looks",
+     .summary = "the table-based vignette for previews: steeper, about 0 in the corners",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_vignette_prev>,
+     .gallery = ""},
+    {.name = "vintage",
+     .family = "looks",
+     .summary = "faded warm film: tone curves, brightness and contrast, then a vignette",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyVintage, applyVintagePartial>,
+     .gallery = ""},
+    {.name = "vintage-preview",
+     .family = "looks",
+     .summary = "a one-pass stand-in for the vintage look, for previews",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_vintage_prev>,
+     .gallery = ""},
+    {.name = "old-photo",
+     .family = "looks",
+     .summary = "sepia with flattened contrast and a vignette",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyOldPhoto, applyOldPhotoPartial>,
+     .gallery = ""},
+    {.name = "old-photo-texture",
+     .family = "looks",
+     .summary = "a warm tone with a quarter of a paper texture mixed in",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = old_photo_texture,
+     .gallery = ""},
+    {.name = "pop-art",
+     .family = "looks",
+     .summary = "four half-size copies, each posterised in its own colours",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<applyPopArt>,
+     .gallery = ""},
+    {.name = "pop-art-preview",
+     .family = "looks",
+     .summary = "four half-size copies, each turned to its own hue, for previews",
+     .selects = Selects::kByTool,
+     .params = {},
+     .run = full_only<fx_apply_popart_prev>,
+     .gallery = ""},
+    {.name = "soft-glow",
+     .family = "looks",
+     .summary = "a slight blur, bright tones lifted and dark ones lowered",
+     .selects = Selects::kMask,
+     .params = {integer("level", 0, 100, 50, "strength of the tone curve; 0 only blurs")},
+     .run = full_and_partial<applySoftglow, applySoftglowPartial>,
+     .gallery = "level=50;level=100"},
+    {.name = "retro",
+     .family = "looks",
+     .summary = "preset: faded, slightly bright and desaturated",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyRetro, applyRetroPartial>,
+     .gallery = ""},
+    {.name = "sunshine",
+     .family = "looks",
+     .summary = "preset: warm and golden, blue held back",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applySunshine, applySunshinePartial>,
+     .gallery = ""},
+    {.name = "downlight",
+     .family = "looks",
+     .summary = "preset: faded and auto-adjusted, soft and dim; takes auto adjust's parameters",
+     .selects = Selects::kMask,
+     .params = {kThreshold, kCutOff, kWeight1, kWeight2},
+     .run = [](const Call& c) {
+       const AutoAdjustSettings settings(c, 0);
+       return full_and_partial<applyDownlight, applyDownlightPartial>(c);
+     },
+     .gallery = ""},
+    {.name = "bluewash",
+     .family = "looks",
+     .summary = "preset: cool and blue, a little more contrast",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyBluewash, applyBluewashPartial>,
+     .gallery = ""},
+    {.name = "nostalgia",
+     .family = "looks",
+     .summary = "preset: faded, bright and warm",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyNostalgia, applyNostalgiaPartial>,
+     .gallery = ""},
+    {.name = "yellow-glow",
+     .family = "looks",
+     .summary = "preset: faded and strongly yellow, with lifted contrast",
+     .selects = Selects::kMask,
+     .params = {},
+     .run = full_and_partial<applyYellowglow, applyYellowglowPartial>,
+     .gallery = ""},
+
+    // ---- Warps ----------------------------------------------------------------------------------
+    {.name = "mirror",
+     .family = "warp",
+     .summary = "keeps one side of a column or row and adds its reflection; changes the size",
+     .selects = Selects::kNothing,
+     .params = {column("column", 500, "the mirror column, with --axis horizontal"),
+                row("row", 500, "the mirror row, with --axis vertical"),
+                choice("mode", kMirrorModes, 0, "the side kept: left or right of the column, "
+                       "top or bottom of the row"),
+                choice("axis", kMirrorAxes, 0, "reflect across a column or a row")},
+     .run = mirror,
+     .gallery = "mode=keep-left;mode=keep-bottom,axis=vertical"},
+    {.name = "sphericity",
+     .family = "warp",
+     .summary = "bulges (level above 0) or pinches (below 0) a circle of about 1.4 x radius",
+     .selects = Selects::kByTool,
+     .params = {column("cx", 500, "the circle's centre column"),
+                row("cy", 500, "the circle's centre row"),
+                length("radius", 1, 250, "the nominal radius in pixels"),
+                integer("level", -100, 100, 60, "strength: above 0 bulges, below 0 pinches"),
+                choice("fast", kOffOn, 0, "on: every second pixel, filled in 2 x 2 blocks")},
+     .run = circle_warp<runSphericity>,
+     .gallery = "level=100;level=-100"},
+    {.name = "twirl",
+     .family = "warp",
+     .summary = "turns a circle by an angle that is largest at its centre and fades to its rim",
+     .selects = Selects::kByTool,
+     .params = {column("cx", 500, "the circle's centre column"),
+                row("cy", 500, "the circle's centre row"),
+                length("radius", 1, 400, "the circle's radius in pixels"),
+                integer("angle", -360, 360, 90, "degrees at the centre; below 0 turns the other "
+                        "way"),
+                choice("fast", kOffOn, 0, "on: every second pixel, filled in 2 x 2 blocks")},
+     .run = circle_warp<runTwirl>,
+     .gallery = "angle=90;angle=-270,fast=on"},
+
+    // ---- Automatic adjustment -------------------------------------------------------------------
+    {.name = "auto-adjust",
+     .family = "auto",
+     .summary = "tone mapping from the picture's histogram (contrast 12 under 150 pixels a side)",
+     .selects = Selects::kByTool,
+     .params = {kThreshold, kCutOff, kWeight1, kWeight2},
+     .run = [](const Call& c) {
+       const AutoAdjustSettings settings(c, 0);
+       return result_code(applyAutoAdjust(c.src(), c.dst(), c.width(), c.height()));
+     },
+     .gallery = ";cutoff=85,weight1=4000"},
 };
 // clang-format on
 

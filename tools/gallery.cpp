@@ -13,14 +13,17 @@
 namespace fxtool {
 namespace {
 
-// Contact-sheet layout: tiles of a thumbnail box over two caption lines.
+// Contact-sheet layout: tiles of a thumbnail box over three caption lines (the effect's name and
+// up to two lines of settings). Eight columns keep a sheet of 80 or so tiles about as wide as it
+// is tall.
 constexpr int32_t kThumbWidth = 192;
 constexpr int32_t kThumbHeight = 144;
 constexpr int32_t kPad = 6;
 constexpr int32_t kLineHeight = kGlyphHeight + 3;
 constexpr int32_t kTileWidth = kThumbWidth + 2 * kPad;
-constexpr int32_t kTileHeight = kPad + kThumbHeight + kPad + 2 * kLineHeight + kPad;
-constexpr int32_t kColumns = 6;
+constexpr int32_t kCaptionLines = 3;
+constexpr int32_t kTileHeight = kPad + kThumbHeight + kPad + kCaptionLines * kLineHeight + kPad;
+constexpr int32_t kColumns = 8;
 constexpr int32_t kHeaderHeight = kPad + kLineHeight + kPad;
 constexpr int32_t kCaptionChars = kThumbWidth / kGlyphAdvance;
 
@@ -81,6 +84,22 @@ std::string fit_caption(std::string s) {
   return s;
 }
 
+// The settings over as many caption lines as are left under the title, broken after a comma
+// where one fits, the last line cut short with '~' if even they do not suffice.
+std::vector<std::string> wrap_detail(std::string_view s) {
+  constexpr size_t kDetailLines = kCaptionLines - 1;
+  const size_t width = static_cast<size_t>(kCaptionChars);
+  std::vector<std::string> out;
+  while (out.size() + 1 < kDetailLines && s.size() > width) {
+    const size_t comma = s.substr(0, width).rfind(',');
+    const size_t cut = comma == std::string_view::npos ? width : comma + 1;
+    out.emplace_back(s.substr(0, cut));
+    s.remove_prefix(cut);
+  }
+  if (!s.empty()) out.push_back(fit_caption(std::string(s)));
+  return out;
+}
+
 Image contact_sheet(const std::vector<Picture>& pictures, const std::string& heading) {
   const int32_t count = static_cast<int32_t>(pictures.size());
   const int32_t columns = std::min(kColumns, std::max(count, 1));
@@ -100,7 +119,11 @@ Image contact_sheet(const std::vector<Picture>& pictures, const std::string& hea
     }
     const int32_t text_top = top + kThumbHeight + kPad;
     draw_text(sheet, left, text_top, fit_caption(p.title), kTitleColour);
-    draw_text(sheet, left, text_top + kLineHeight, fit_caption(p.detail), kDetailColour);
+    int32_t line_top = text_top + kLineHeight;
+    for (const std::string& line : wrap_detail(p.detail)) {
+      draw_text(sheet, left, line_top, line, kDetailColour);
+      line_top += kLineHeight;
+    }
   }
   return sheet;
 }
