@@ -37,6 +37,9 @@ constexpr bool is_region(const Rect& r) { return r.left <= r.right && r.top <= r
 // top > bottom): a rectangle entirely off the image selects nothing, it does not turn into
 // whole-image mode, so decide the mode before clipping.
 constexpr Rect clip_to_image(Rect r, int32_t width, int32_t height) {
+  // An image without pixels leaves nothing of any rectangle (and width - 1 would overflow for a
+  // width of INT32_MIN, letting the rectangle through unclipped).
+  if (width <= 0 || height <= 0) return {0, -1, 0, -1};
   if (r.left < 0) r.left = 0;
   if (r.top < 0) r.top = 0;
   if (r.right > width - 1) r.right = width - 1;

@@ -105,6 +105,13 @@ const Op kOps[] = {
     {"AdjustRGB", partial_gains<AdjustRGB>},
     {"rubLighten", brush<rubLighten>},
     {"rubDarken", brush<rubDarken>},
+    {"controlSaturationPartial", partial_level<controlSaturationPartial>},
+    {"controlTemperature", full_level<controlTemperature>},
+    {"controlExposure", full_level<controlExposure>},
+    {"controlHuePartial", partial_level<controlHuePartial>},
+    {"controlFadedColour", full_level<controlFadedColour>},
+    {"applyInvert", full_plain<applyInvert>},
+    {"controlAdjustRGB", full_gains<controlAdjustRGB>},
 };
 
 }  // namespace

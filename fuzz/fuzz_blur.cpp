@@ -26,7 +26,8 @@ void sharpen_all(FuzzedDataProvider& in) {
 void sharpen_partial(FuzzedDataProvider& in) {
   partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
                          FuzzedDataProvider& p) {
-    applySharpen(s, m, d, z.width, z.height, pick_level(p), b.left, b.right, b.top, b.bottom);
+    (p.ConsumeBool() ? applySharpen : fx_apply_sharpen)(s, m, d, z.width, z.height, pick_level(p),
+                                                        b.left, b.right, b.top, b.bottom);
   });
 }
 
@@ -35,7 +36,7 @@ void pixelize(FuzzedDataProvider& in) {
     const int32_t shift = pick_shift(p);
     const std::vector<uint32_t> before =
         d ? std::vector<uint32_t>(d, d + z.pixels) : std::vector<uint32_t>();
-    applyPixelize(s, d, z.width, z.height, shift);
+    (p.ConsumeBool() ? applyPixelize : fx_apply_pixelize)(s, d, z.width, z.height, shift);
     if (d && !valid_shift(shift)) FUZZ_CHECK(std::vector<uint32_t>(d, d + z.pixels) == before);
   });
 }
@@ -43,16 +44,17 @@ void pixelize(FuzzedDataProvider& in) {
 // A brush edits only inside its bounding square cx, cy +- radius; red-eye changes only red.
 void brush(FuzzedDataProvider& in) {
   Images im(in);
-  const bool redeye = in.ConsumeBool();
+  const bool redeye = in.ConsumeBool(), entry = in.ConsumeBool();
   const int32_t shift = pick_shift(in);
   const int32_t cx = pick_coord(in, im.size.width), cy = pick_coord(in, im.size.height);
   const int32_t radius = in.ConsumeBool() ? pick_level(in) : in.ConsumeIntegralInRange(-2, 12);
   for (size_t i = 0; i < im.dst.size(); ++i) im.dst.data()[i] = im.src.data()[i];
   uint32_t* img = im.null_dst ? nullptr : im.dst.data();
   if (redeye) {
-    removeRedeye(img, im.size.width, im.size.height, cx, cy, radius);
+    (entry ? removeRedeye : fx_remove_redeye)(img, im.size.width, im.size.height, cx, cy, radius);
   } else {
-    rubPixelize(img, im.size.width, im.size.height, shift, cx, cy, radius);
+    (entry ? rubPixelize : fx_rub_pixelize)(img, im.size.width, im.size.height, shift, cx, cy,
+                                            radius);
   }
   im.check();
   if (img == nullptr || too_large(im.size) ||

@@ -66,7 +66,11 @@ void memory(FuzzedDataProvider& in) {
   const uint32_t n = in.ConsumeIntegralInRange<uint32_t>(0, 4096);
   auto* q = static_cast<uint8_t*>(fx_calloc(n, 1));
   if (q != nullptr) {
-    fx_memset(q, in.ConsumeIntegral<uint8_t>(), n);
+    const uint8_t v = in.ConsumeIntegral<uint8_t>();
+    FUZZ_CHECK(fx_memset(q, v, n) == q);
+    Guarded<uint8_t> copy(n, 0x6B);
+    FUZZ_CHECK(fx_memcpy(copy.data(), q, n) == copy.data());
+    FUZZ_CHECK(copy.guards_intact() && copy.contents() == std::vector<uint8_t>(n, v));
     q = static_cast<uint8_t*>(fx_realloc(q, n + 8));
   }
   fx_free(q);

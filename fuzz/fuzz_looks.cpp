@@ -49,10 +49,28 @@ void curves(FuzzedDataProvider& in) {
   }
 }
 
+void greyscale_impl(FuzzedDataProvider& in) {
+  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
+    fx_control_greyscale_all(s, d, z.width, z.height, pick_level(p));
+  });
+}
+
+void greyscale_impl_partial(FuzzedDataProvider& in) {
+  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
+                         FuzzedDataProvider& p) {
+    fx_control_greyscale(s, m, d, z.width, z.height, pick_level(p), b.left, b.right, b.top,
+                         b.bottom);
+  });
+}
+
 const Op kOps[] = {
-    {"greyscale", greyscale}, {"greyscale partial", greyscale_partial},
-    {"sepia", sepia},         {"sepia partial", sepia_partial},
+    {"greyscale", greyscale},
+    {"greyscale partial", greyscale_partial},
+    {"sepia", sepia},
+    {"sepia partial", sepia_partial},
     {"curves", curves},
+    {"fx greyscale", greyscale_impl},
+    {"fx greyscale partial", greyscale_impl_partial},
 };
 
 }  // namespace

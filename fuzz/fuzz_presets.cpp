@@ -63,7 +63,7 @@ void partial_look(FuzzedDataProvider& in) {
   const Rect b = pick_bounds(in, im.size);
   const std::vector<uint32_t> before = im.dst.contents();
   Fn(im.s(), im.m(), im.d(), im.size.width, im.size.height, b.left, b.right, b.top, b.bottom);
-  if (im.null_src || im.null_dst || (is_region(b) && im.null_mask) || too_large(im.size)) {
+  if (im.null_src || im.null_dst || (is_region(b) && im.null_mask) || nothing_to_do(im.size)) {
     im.check_untouched(before);
     return;
   }

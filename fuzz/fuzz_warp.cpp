@@ -37,8 +37,11 @@ void mirror(FuzzedDataProvider& in) {
   const int32_t axis = in.PickValueInArray({MIRROR_VERTICAL, MIRROR_HORIZONTAL, MIRROR_VERTICAL,
                                             MIRROR_HORIZONTAL, 0, MIRROR_KEEP_LEFT});
   const int32_t pos = pick_coord(in, axis == MIRROR_VERTICAL ? im.size.height : im.size.width);
-  int32_t dw = getMirrorOutwidth(im.size.width, pos, mode, axis);
-  int32_t dh = getMirrorOutheight(im.size.height, pos, mode, axis);
+  const bool entry = in.ConsumeBool();
+  int32_t dw =
+      (entry ? getMirrorOutwidth : fx_get_mirror_out_width)(im.size.width, pos, mode, axis);
+  int32_t dh =
+      (entry ? getMirrorOutheight : fx_get_mirror_out_height)(im.size.height, pos, mode, axis);
   if (in.ConsumeIntegralInRange<int>(0, 7) == 0) dw = pick_coord(in, dw);
   if (in.ConsumeIntegralInRange<int>(0, 7) == 0) dh = pick_coord(in, dh);
   // A buffer as large as the sizes claim, unless they claim more than any call may use.
@@ -46,7 +49,8 @@ void mirror(FuzzedDataProvider& in) {
   Pixels dst(n <= 4096 ? static_cast<size_t>(n) : 16, 0xD5D5D5D5u);
   const std::vector<uint32_t> before = dst.contents();
   uint32_t* d = im.null_dst ? nullptr : dst.data();
-  const int32_t code = runMirror(im.s(), im.size.width, im.size.height, d, dw, dh, pos, mode, axis);
+  const int32_t code = (entry ? runMirror : fx_mirror)(im.s(), im.size.width, im.size.height, d, dw,
+                                                       dh, pos, mode, axis);
   im.check();
   FUZZ_CHECK(dst.guards_intact());
   if (code != PHOTOFX_SUCCESS) {
@@ -57,8 +61,9 @@ void mirror(FuzzedDataProvider& in) {
   }
 }
 
-// Sphericity or twirl: Fn(src, dst, w, h, cx, cy, radius, strength, window..., fast).
-template <auto Fn>
+// Sphericity or twirl: Fn(src, dst, w, h, cx, cy, radius, strength, window..., fast). Now and
+// then through the entry point Entry, which returns nothing and must write what Fn writes.
+template <auto Fn, auto Entry>
 void circle_warp(FuzzedDataProvider& in, int32_t lo, int32_t hi) {
   Images im(in);
   const int32_t cx = pick_coord(in, im.size.width), cy = pick_coord(in, im.size.height);
@@ -68,8 +73,16 @@ void circle_warp(FuzzedDataProvider& in, int32_t lo, int32_t hi) {
   const bool in_place = !im.null_src && in.ConsumeIntegralInRange<int>(0, 7) == 0;
   const std::vector<uint32_t> before = im.dst.contents();
   uint32_t* d = in_place ? im.src.data() : im.d();
+  const bool entry = in.ConsumeIntegralInRange<int>(0, 3) == 0;
+  Pixels twin(im.dst.size(), 0xD5D5D5D5u);
+  if (entry && !in_place) {
+    Entry(im.s(), d, im.size.width, im.size.height, cx, cy, radius, strength, b.left, b.right,
+          b.top, b.bottom, fast);
+    d = d == nullptr ? nullptr : twin.data();
+  }
   const int32_t code = Fn(im.s(), d, im.size.width, im.size.height, cx, cy, radius, strength,
                           b.left, b.right, b.top, b.bottom, fast);
+  if (entry && !in_place) FUZZ_CHECK(twin.guards_intact() && twin.contents() == im.dst.contents());
   if (in_place) {
     // Always refused; check() compares the source, so it proves nothing was written.
     FUZZ_CHECK(code == PHOTOFX_INVALID_ARGUMENT);
@@ -89,8 +102,9 @@ const Op kOps[] = {
     {"Bilinear_Fixed", bilinear},
     {"FATAN2", fatan2},
     {"mirror", mirror},
-    {"sphericity", [](FuzzedDataProvider& in) { circle_warp<fx_sphericity>(in, -120, 120); }},
-    {"twirl", [](FuzzedDataProvider& in) { circle_warp<fx_twirl>(in, -400, 400); }},
+    {"sphericity",
+     [](FuzzedDataProvider& in) { circle_warp<fx_sphericity, runSphericity>(in, -120, 120); }},
+    {"twirl", [](FuzzedDataProvider& in) { circle_warp<fx_twirl, runTwirl>(in, -400, 400); }},
 };
 
 }  // namespace

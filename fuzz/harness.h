@@ -66,13 +66,17 @@ struct Size {
 };
 
 // Mostly small images, sometimes empty or negative, sometimes a size whose pixel count no
-// library buffer could hold (the library must refuse it without touching the small buffer).
+// library buffer could hold or a side at the negative end of 32 bits (the library must refuse
+// either without touching the small buffer it is given).
 inline Size pick_size(FuzzedDataProvider& in, int32_t max_side = 24) {
   if (in.ConsumeIntegralInRange<int>(0, 15) == 0) {
-    static constexpr int32_t kHuge[][2] = {
-        {65536, 65536}, {INT32_MAX, 2}, {2, INT32_MAX}, {46341, 46341}, {INT32_MAX, INT32_MAX}};
-    const auto& s = kHuge[in.ConsumeIntegralInRange<size_t>(0, 4)];
-    return {s[0], s[1], 16};
+    static constexpr int32_t kExtreme[][2] = {
+        {65536, 65536},         {INT32_MAX, 2},        {2, INT32_MAX}, {46341, 46341},
+        {INT32_MAX, INT32_MAX}, {INT32_MIN, 3},        {3, INT32_MIN}, {INT32_MIN, INT32_MIN},
+        {-65536, 65536},        {INT32_MIN, INT32_MAX}};
+    const auto& s = kExtreme[in.ConsumeIntegralInRange<size_t>(0, 9)];
+    // A few pixels where the size claims too many; none where it claims none.
+    return {s[0], s[1], pixel_count(s[0], s[1]) == 0 ? size_t{0} : size_t{16}};
   }
   const int32_t w = in.ConsumeIntegralInRange<int32_t>(-2, max_side);
   const int32_t h = in.ConsumeIntegralInRange<int32_t>(-2, max_side);
@@ -115,17 +119,28 @@ struct Images {
   std::vector<uint32_t> src_before;
   std::vector<uint8_t> mask_before;
 
+  // Pixels and mask bytes drawn from the input; an image larger than kTile pixels repeats its
+  // first kTile, so that a short input still fills a large image with varied content.
+  static constexpr size_t kTile = 1024;
+
   explicit Images(FuzzedDataProvider& in, int32_t max_side = 24)
-      : size(pick_size(in, max_side)),
-        src(size.pixels, 0x5EC0DE5Eu),
-        dst(size.pixels, 0xD5D5D5D5u),
-        mask(size.pixels, 0x3C) {
+      : Images(in, pick_size(in, max_side)) {}
+
+  Images(FuzzedDataProvider& in, Size s)
+      : size(s), src(s.pixels, 0x5EC0DE5Eu), dst(s.pixels, 0xD5D5D5D5u), mask(s.pixels, 0x3C) {
     null_src = in.ConsumeIntegralInRange<int>(0, 31) == 0;
     null_dst = in.ConsumeIntegralInRange<int>(0, 31) == 0;
     null_mask = in.ConsumeIntegralInRange<int>(0, 15) == 0;
-    src.fill(in);
+    const size_t n = size.pixels;
+    for (size_t i = 0; i < n; ++i) {
+      src.data()[i] = i < kTile ? in.ConsumeIntegral<uint32_t>() : src.data()[i % kTile];
+    }
     // Mostly 0 and 1, so that selections are neither empty nor everything.
-    for (size_t i = 0; i < mask.size(); ++i) {
+    for (size_t i = 0; i < n; ++i) {
+      if (i >= kTile) {
+        mask.data()[i] = mask.data()[i % kTile];
+        continue;
+      }
       const uint8_t b = in.ConsumeIntegral<uint8_t>();
       mask.data()[i] = b < 100 ? 0 : (b < 230 ? 1 : b);
     }
@@ -172,6 +187,11 @@ namespace pfx::fuzz {
 
 inline bool too_large(const Size& s) { return pixel_count(s.width, s.height) > kMaxPixels; }
 
+// An image with no pixel to visit, or one too large to address: a call writes nothing.
+inline bool nothing_to_do(const Size& s) {
+  return pixel_count(s.width, s.height) == 0 || too_large(s);
+}
+
 // Calls fn(src, dst, w, h, extra...) as a full variant, into dst or in place, and checks the
 // buffers. `refused` says whether the call must have written nothing.
 template <class Call>
@@ -186,7 +206,7 @@ void full_variant(FuzzedDataProvider& in, Call call) {
     return;
   }
   call(im.s(), im.d(), im.size, in);
-  if (im.null_src || im.null_dst || too_large(im.size)) {
+  if (im.null_src || im.null_dst || nothing_to_do(im.size)) {
     im.check_untouched(before);
   } else {
     im.check();
@@ -200,7 +220,7 @@ void partial_variant(FuzzedDataProvider& in, Call call) {
   const Rect b = pick_bounds(in, im.size);
   const std::vector<uint32_t> before = im.dst.contents();
   call(im.s(), im.m(), im.d(), im.size, b, in);
-  if (im.null_src || im.null_dst || (is_region(b) && im.null_mask) || too_large(im.size)) {
+  if (im.null_src || im.null_dst || (is_region(b) && im.null_mask) || nothing_to_do(im.size)) {
     im.check_untouched(before);
   } else {
     im.check();

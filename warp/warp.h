@@ -89,8 +89,7 @@ inline bool buffers_overlap(const uint32_t* a, int64_t na, const uint32_t* b, in
 inline bool warp_args_ok(const uint32_t* src, const uint32_t* dst, int32_t width, int32_t height,
                          int32_t cx, int32_t cy) {
   if (src == nullptr || dst == nullptr) return false;
-  if (cx < 0 || cx > width - 1 || cy < 0 || cy > height - 1)
-    return false;  // also width, height >= 1
+  if (cx < 0 || cx >= width || cy < 0 || cy >= height) return false;  // also width, height >= 1
   const int64_t n = pixel_count(width, height);
   return n <= kMaxPixels && !buffers_overlap(src, n, dst, n);
 }
