@@ -1,5 +1,5 @@
-// Saturation and temperature: the worked values, the chroma shifts per level, the ends of the
-// slider and levels far beyond them.
+// Saturation and temperature: the worked values, the chroma shifts per level, and every colour
+// pinned where levels far beyond the slider are held.
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -16,12 +16,6 @@ using FullFn = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t, int32_t);
 uint32_t one(FullFn fn, uint32_t p, int32_t level) {
   uint32_t out = 0;
   fn(&p, &out, 1, 1, level);
-  return out;
-}
-
-Pixels saturated(const Pixels& img, int32_t level) {
-  Pixels out(img.size());
-  fx_control_saturation_all(img.data(), out.data(), 16, 16, level);
   return out;
 }
 
@@ -51,16 +45,6 @@ TEST(SaturationTemperature, WorkedValues) {
   for (const auto& c : kCases) EXPECT_EQ(one(c.fn, c.in, c.level), c.out) << std::hex << c.in;
 }
 
-TEST(Saturation, LevelsBeyondTheEndsActLikeTheEnds) {
-  const Pixels img = pfx::test::random_image(16, 16, 3);
-  const Pixels grey = saturated(img, 0);
-  const Pixels vivid = saturated(img, 20);
-  for (int32_t level : {-1, -5, -1000, INT32_MIN}) EXPECT_EQ(saturated(img, level), grey);
-  for (int32_t level : {21, 25, 1000, INT32_MAX}) EXPECT_EQ(saturated(img, level), vivid);
-  EXPECT_NE(saturated(img, 19), vivid);
-  EXPECT_NE(saturated(img, 1), grey);
-}
-
 // The signed chroma shifts per level, as the slider documents them. On mid grey (luma 128,
 // chroma 0) they show directly in the converted-back channels.
 TEST(Temperature, ChromaShiftsFollowTheLevelTable) {
@@ -79,7 +63,7 @@ TEST(Temperature, ChromaShiftsFollowTheLevelTable) {
 }
 
 // Holding the level at 1000 steps from neutral is exact only if every colour is already pinned
-// there; check all of them, then that levels further out give the same pinned colours.
+// there; check all of them.
 TEST(Temperature, ThousandStepsFromNeutralPinEveryColour) {
   Pixels img(256 * 256), out(img.size());
   const struct {
@@ -94,12 +78,6 @@ TEST(Temperature, ThousandStepsFromNeutralPinEveryColour) {
         ASSERT_EQ(out[i], (img[i] & 0xFF000000u) | e.colour) << std::hex << img[i];
       }
     }
-  }
-  const Pixels rnd = pfx::test::random_image(16, 16, 4);
-  for (int32_t level : {1011, 5000, INT32_MAX, -991, -5000, INT32_MIN}) {
-    fx_control_temperature_all(rnd.data(), out.data(), 16, 16, level);
-    const uint32_t colour = level > 0 ? 0xFF0000u : 0x00FFFFu;
-    for (size_t i = 0; i < rnd.size(); ++i) ASSERT_EQ(out[i], (rnd[i] & 0xFF000000u) | colour);
   }
 }
 
