@@ -1,5 +1,5 @@
-// Saturation and temperature: the worked values, the level table of the chroma shifts, the ends
-// of the slider and levels far beyond them.
+// Saturation and temperature: the worked values, the chroma shifts per level, and every colour
+// pinned where levels far beyond the slider are held.
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -11,77 +11,38 @@ namespace {
 
 using pfx::test::Pixels;
 
-uint32_t saturation(uint32_t p, int32_t level) {
+using FullFn = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t, int32_t);
+
+uint32_t one(FullFn fn, uint32_t p, int32_t level) {
   uint32_t out = 0;
-  fx_control_saturation_all(&p, &out, 1, 1, level);
+  fn(&p, &out, 1, 1, level);
   return out;
 }
 
-uint32_t temperature(uint32_t p, int32_t level) {
-  uint32_t out = 0;
-  fx_control_temperature_all(&p, &out, 1, 1, level);
-  return out;
-}
-
-Pixels saturated(const Pixels& img, int32_t w, int32_t h, int32_t level) {
-  Pixels out(img.size());
-  fx_control_saturation_all(img.data(), out.data(), w, h, level);
-  return out;
-}
-
-Pixels warmed(const Pixels& img, int32_t w, int32_t h, int32_t level) {
-  Pixels out(img.size());
-  fx_control_temperature_all(img.data(), out.data(), w, h, level);
-  return out;
-}
-
-TEST(Saturation, NeutralLevelChangesNothing) {
-  const Pixels img = pfx::test::random_image(32, 8, 1);
-  EXPECT_EQ(saturated(img, 32, 8, 10), img);
-}
-
-TEST(Saturation, LevelZeroIsTheWeightedGrey) {
-  EXPECT_EQ(saturation(0xFFFF0000u, 0), 0xFF4E4E4Eu);
-  EXPECT_EQ(saturation(0xFF3366CCu, 0), 0xFF5E5E5Eu);
-  const Pixels img = pfx::test::random_image(16, 16, 2);
-  const Pixels out = saturated(img, 16, 16, 0);
-  for (size_t i = 0; i < img.size(); ++i) {
-    const uint32_t p = img[i];
-    const uint32_t grey = (316 * ((p >> 16) & 255) + 624 * ((p >> 8) & 255) + 84 * (p & 255)) >> 10;
-    ASSERT_EQ(out[i], (p & 0xFF000000u) | grey * 0x010101u) << i;
-  }
-}
-
-TEST(Saturation, AboveNeutralPushesAwayFromGreyAndHoldsTheChannels) {
-  EXPECT_EQ(saturation(0xFFFF0000u, 20), 0xFFFF0000u);
-  // Level 15: the grey weights are negative (rounded toward minus infinity), blue overshoots
-  // to 258 and is held at 255.
-  EXPECT_EQ(saturation(0xFF3366CCu, 15), 0xFF1C69FFu);
-  EXPECT_EQ(saturation(0x20808080u, 20), 0x20808080u);
-}
-
-TEST(Saturation, LevelsBeyondTheEndsActLikeTheEnds) {
-  const Pixels img = pfx::test::random_image(16, 16, 3);
-  const Pixels grey = saturated(img, 16, 16, 0);
-  const Pixels vivid = saturated(img, 16, 16, 20);
-  EXPECT_NE(grey, vivid);
-  for (int32_t level : {-1, -5, -1000, INT32_MIN}) EXPECT_EQ(saturated(img, 16, 16, level), grey);
-  for (int32_t level : {21, 25, 1000, INT32_MAX}) EXPECT_EQ(saturated(img, 16, 16, level), vivid);
-  EXPECT_NE(saturated(img, 16, 16, 19), vivid);
-  EXPECT_NE(saturated(img, 16, 16, 1), grey);
-}
-
-TEST(Temperature, WarmsAboveAndCoolsBelowNeutral) {
-  EXPECT_EQ(temperature(0xFF808080u, 20), 0xFFA3794Au);
-  EXPECT_EQ(temperature(0xFF808080u, 0), 0xFF5C88B5u);
-  EXPECT_EQ(temperature(0xFF808080u, 10), 0xFF808080u);
-  EXPECT_EQ(temperature(0x33808080u, 20), 0x33A3794Au);
-}
-
-TEST(Temperature, NeutralLevelStillMakesTheYCbCrRoundTrip) {
-  EXPECT_EQ(temperature(0xFFFF0000u, 10), 0xFFFE0000u);
-  EXPECT_EQ(temperature(0xFF0000FFu, 10), 0xFF0000FDu);
-  EXPECT_EQ(temperature(0xFFFFFFFFu, 10), 0xFFFFFFFFu);
+TEST(SaturationTemperature, WorkedValues) {
+  const struct {
+    FullFn fn;
+    uint32_t in;
+    int32_t level;
+    uint32_t out;
+  } kCases[] = {
+      {fx_control_saturation_all, 0xFF123456u, 10, 0xFF123456u},  // neutral
+      {fx_control_saturation_all, 0xFFFF0000u, 0, 0xFF4E4E4Eu},   // the weighted grey
+      {fx_control_saturation_all, 0xFF3366CCu, 0, 0xFF5E5E5Eu},
+      {fx_control_saturation_all, 0xFFFF0000u, 20, 0xFFFF0000u},
+      // Level 15: the grey weights are negative (rounded toward minus infinity), blue overshoots
+      // to 258 and is held at 255.
+      {fx_control_saturation_all, 0xFF3366CCu, 15, 0xFF1C69FFu},
+      {fx_control_saturation_all, 0x20808080u, 20, 0x20808080u},
+      {fx_control_temperature_all, 0xFF808080u, 20, 0xFFA3794Au},  // warmer
+      {fx_control_temperature_all, 0xFF808080u, 0, 0xFF5C88B5u},   // cooler
+      {fx_control_temperature_all, 0x33808080u, 20, 0x33A3794Au},
+      // The neutral level still makes the YCbCr round trip.
+      {fx_control_temperature_all, 0xFFFF0000u, 10, 0xFFFE0000u},
+      {fx_control_temperature_all, 0xFF0000FFu, 10, 0xFF0000FDu},
+      {fx_control_temperature_all, 0xFFFFFFFFu, 10, 0xFFFFFFFFu},
+  };
+  for (const auto& c : kCases) EXPECT_EQ(one(c.fn, c.in, c.level), c.out) << std::hex << c.in;
 }
 
 // The signed chroma shifts per level, as the slider documents them. On mid grey (luma 128,
@@ -96,34 +57,27 @@ TEST(Temperature, ChromaShiftsFollowTheLevelTable) {
     const int32_t r = 128 + ((359 * cr) >> 8);
     const int32_t g = 128 - ((88 * cb + 183 * cr) >> 8);
     const int32_t b = 128 + ((454 * cb) >> 8);
-    EXPECT_EQ(temperature(0xFF808080u, level), pfx::test::argb(255, r, g, b)) << level;
+    EXPECT_EQ(one(fx_control_temperature_all, 0xFF808080u, level), pfx::test::argb(255, r, g, b))
+        << level;
   }
 }
 
 // Holding the level at 1000 steps from neutral is exact only if every colour is already pinned
-// there; check all of them, then that levels further out give the same pinned colours.
+// there; check all of them.
 TEST(Temperature, ThousandStepsFromNeutralPinEveryColour) {
-  Pixels img(256 * 256), hot(img.size()), cold(img.size());
+  Pixels img(256 * 256), out(img.size());
+  const struct {
+    int32_t level;
+    uint32_t colour;
+  } kEnds[] = {{1010, 0xFF0000u}, {-990, 0x00FFFFu}};
   for (uint32_t r = 0; r < 256; ++r) {
-    for (uint32_t i = 0; i < img.size(); ++i) img[i] = 0xFF000000u | r << 16 | i;
-    fx_control_temperature_all(img.data(), hot.data(), 256, 256, 1010);
-    fx_control_temperature_all(img.data(), cold.data(), 256, 256, -990);
-    for (uint32_t i = 0; i < img.size(); ++i) {
-      ASSERT_EQ(hot[i], 0xFFFF0000u) << std::hex << img[i];
-      ASSERT_EQ(cold[i], 0xFF00FFFFu) << std::hex << img[i];
+    for (uint32_t i = 0; i < img.size(); ++i) img[i] = (i & 0xFF) << 24 | r << 16 | i;
+    for (const auto& e : kEnds) {
+      fx_control_temperature_all(img.data(), out.data(), 256, 256, e.level);
+      for (uint32_t i = 0; i < img.size(); ++i) {
+        ASSERT_EQ(out[i], (img[i] & 0xFF000000u) | e.colour) << std::hex << img[i];
+      }
     }
-  }
-}
-
-TEST(Temperature, LevelsFarBeyondTheSliderStayPinned) {
-  const Pixels img = pfx::test::random_image(16, 16, 4);
-  for (int32_t level : {1011, 5000, INT32_MAX}) {
-    const Pixels out = warmed(img, 16, 16, level);
-    for (size_t i = 0; i < img.size(); ++i) ASSERT_EQ(out[i], (img[i] & 0xFF000000u) | 0xFF0000u);
-  }
-  for (int32_t level : {-991, -5000, INT32_MIN}) {
-    const Pixels out = warmed(img, 16, 16, level);
-    for (size_t i = 0; i < img.size(); ++i) ASSERT_EQ(out[i], (img[i] & 0xFF000000u) | 0x00FFFFu);
   }
 }
 
