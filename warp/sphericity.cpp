@@ -100,8 +100,6 @@ struct Sphericity {
   }
 };
 
-}  // namespace
-
 // Circles whose rim is below 2^26 (radius up to 5860) keep every coordinate offset below 8192,
 // and the rule then runs on 32-bit words without a division per pixel. The pull k depends on
 // the pixel only through the falloff index t (0 ... 256), so everything that takes a division is
@@ -118,7 +116,6 @@ struct Sphericity {
 // (its whole pixels from bit 11 up, its weight below): with k = 128 kh + kl that is
 // kh dx + (kl dx >> 7), exactly, in 32 bits.
 struct SphereRun {
-  const uint32_t* src;
   int32_t width, height, cx, cy;
   uint32_t inv_rim;  // 2^30 / rim
   bool pinch;
@@ -128,22 +125,18 @@ struct SphereRun {
 
 // Warped values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
 // row dy below it.
-PFX_VECTOR_CLONES void sphericity_run(const SphereRun& run, int32_t dy, int32_t dx0, int32_t step,
-                                      int32_t n, uint32_t* __restrict out) {
-  const uint32_t* __restrict src = run.src;
+PFX_VECTOR_CLONES void sphericity_run(const SphereRun& run, const uint32_t* __restrict src,
+                                      int32_t dy, int32_t dx0, int32_t step, int32_t n,
+                                      uint32_t* __restrict out) {
   const int32_t width = run.width, height = run.height, cx = run.cx, cy = run.cy;
   const uint32_t inv_rim = run.inv_rim;
   const uint32_t dy2 = static_cast<uint32_t>(dy * dy);
-  const auto hold = [](int32_t c, int32_t size, int32_t& lo, int32_t& hi) {
-    lo = c < 0 ? 0 : (c > size - 1 ? size - 1 : c);
-    hi = c + 1 < 0 ? 0 : (c + 1 > size - 1 ? size - 1 : c + 1);
-  };
   if (run.pinch) {
     // Source at pos + k d / 2^18 along each axis.
-    const auto axis = [&](int32_t pos, int32_t d, int32_t kh, int32_t kl, int32_t size, int32_t& lo,
-                          int32_t& hi, uint32_t& f) {
+    const auto axis = [](int32_t pos, int32_t d, int32_t kh, int32_t kl, int32_t& coord,
+                         uint32_t& f) {
       const int32_t p7 = kh * d + ((kl * d) >> 7);
-      hold(pos + (p7 >> 11), size, lo, hi);
+      coord = pos + (p7 >> 11);
       f = static_cast<uint32_t>(p7 & 2047);
     };
     const int32_t y = cy + dy;
@@ -152,45 +145,44 @@ PFX_VECTOR_CLONES void sphericity_run(const SphereRun& run, int32_t dy, int32_t 
       const uint32_t d2 = static_cast<uint32_t>(dx * dx) + dy2;
       const uint32_t t = (d2 * inv_rim) >> 22;
       const int32_t kh = run.k_hi[t], kl = run.k_lo[t];
-      int32_t xa = 0, xb = 0, ya = 0, yb = 0;
+      int32_t sx = 0, sy = 0;
       uint32_t fx = 0, fy = 0;
-      axis(cx + dx, dx, kh, kl, width, xa, xb, fx);
-      axis(y, dy, kh, kl, height, ya, yb, fy);
-      const int32_t top = ya * width, bottom = yb * width;
-      out[i] =
-          blend_bilinear(fx, fy, src[top + xa], src[top + xb], src[bottom + xa], src[bottom + xb]);
+      axis(cx + dx, dx, kh, kl, sx, fx);
+      axis(y, dy, kh, kl, sy, fy);
+      out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
     }
     return;
   }
   // Source at centre + floor(d 2^18 / den) along each axis, the remainder giving the weight.
-  const auto axis = [&](int32_t centre, int32_t d, uint32_t den, uint32_t recip, int32_t size,
-                        int32_t& lo, int32_t& hi, uint32_t& f) {
+  const auto axis = [](int32_t centre, int32_t d, uint32_t den, uint32_t recip, int32_t& coord,
+                       uint32_t& f) {
     const uint32_t m = static_cast<uint32_t>(d < 0 ? -d : d);
     uint32_t q = (m * recip) >> 19;
     uint32_t r = (m << 18) - q * den;
     q = r >= den ? q + 1 : q;
     r = r >= den ? r - den : r;
-    const bool neg = d < 0, inexact = r != 0;
-    hold(neg ? centre - static_cast<int32_t>(q) - (inexact ? 1 : 0)
-             : centre + static_cast<int32_t>(q),
-         size, lo, hi);
-    f = ((recip >> 7) * (neg && inexact ? den - r : r)) >> 19;
+    // For d < 0 the quotient is negated and, when inexact, floored one further. Written as
+    // arithmetic on the sign rather than a choice, because d is the same for a whole row on the
+    // y axis and the vectoriser cannot choose by a value outside the loop.
+    const int32_t neg = d < 0 ? 1 : 0;
+    const int32_t back = (r != 0 ? 1 : 0) & neg;
+    coord = centre + ((static_cast<int32_t>(q) ^ -neg) + neg) - back;
+    f = ((recip >> 7) * (back != 0 ? den - r : r)) >> 19;
   };
   for (int32_t i = 0; i < n; ++i) {
     const int32_t dx = dx0 + step * i;
     const uint32_t d2 = static_cast<uint32_t>(dx * dx) + dy2;
     const uint32_t t = (d2 * inv_rim) >> 22;
     const uint32_t den = run.den[t], recip = run.recip[t];
-    int32_t xa = 0, xb = 0, ya = 0, yb = 0;
+    int32_t sx = 0, sy = 0;
     uint32_t fx = 0, fy = 0;
-    axis(cx, dx, den, recip, width, xa, xb, fx);
-    axis(cy, dy, den, recip, height, ya, yb, fy);
-    const int32_t top = ya * width, bottom = yb * width;
-    out[i] =
-        blend_bilinear(fx, fy, src[top + xa], src[top + xb], src[bottom + xa], src[bottom + xb]);
+    axis(cx, dx, den, recip, sx, fx);
+    axis(cy, dy, den, recip, sy, fy);
+    out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
   }
 }
 
+}  // namespace
 }  // namespace pfx
 
 extern "C" {
@@ -203,13 +195,12 @@ int32_t fx_sphericity(const uint32_t* src, uint32_t* dst, int32_t width, int32_t
   const pfx::Sphericity rule(cx, cy, radius, level);
   const pfx::Rect window{left, right, top, bottom};
   const uint64_t limit = static_cast<uint64_t>(rule.rim);
-  if (rule.rim >= (int64_t{1} << 26)) {
+  if (rule.rim >= (int64_t{1} << 26) || width < 2) {
     pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit,
                      pfx::sample_each(src, width, height, rule));
     return PHOTOFX_SUCCESS;
   }
   pfx::SphereRun run{};
-  run.src = src;
   run.width = width;
   run.height = height;
   run.cx = cx;
@@ -230,7 +221,7 @@ int32_t fx_sphericity(const uint32_t* src, uint32_t* dst, int32_t width, int32_t
   }
   pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit,
                    [&](int32_t y, int32_t x0, int32_t step, int32_t n, uint32_t* out) {
-                     pfx::sphericity_run(run, y - cy, x0 - cx, step, n, out);
+                     pfx::sphericity_run(run, src, y - cy, x0 - cx, step, n, out);
                    });
   return PHOTOFX_SUCCESS;
 }

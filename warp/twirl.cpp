@@ -76,6 +76,20 @@ constinit const int32_t SIN[4097] = {PFX_TABLE_4096(sin_entry, 0), sin_entry(409
 
 }  // extern "C"
 
+namespace {
+
+constexpr uint32_t sin_cos_entry(int32_t r) {
+  return static_cast<uint32_t>(sin_entry(r)) | static_cast<uint32_t>(sin_entry(4096 - r)) << 16;
+}
+
+}  // namespace
+
+namespace pfx {
+
+constinit const uint32_t kSinCos[4096] = {PFX_TABLE_4096(sin_cos_entry, 0)};
+
+}  // namespace pfx
+
 namespace pfx {
 namespace {
 
@@ -167,8 +181,6 @@ struct Twirl {
   }
 };
 
-}  // namespace
-
 // Radii up to 4095 keep every quantity of the rule below 2^32, so the pixels away from the centre
 // take the same steps on 32-bit words, with the two divisions of a pixel replaced: 2^29 / hi of
 // the arctangent read from kInverse29, and the sine index (turned / 360) >> 5 written as the
@@ -182,7 +194,6 @@ struct Twirl {
 // exactly (the bits of B below 7 cannot carry into bit 14), while T's low 14 bits are those of
 // the wrapped 32-bit sum (A << 7) + B.
 struct TwirlRun {
-  const uint32_t* src;
   int32_t width, height, cx, cy;
   uint32_t radius;  // 1 ... 4095
   uint32_t inv_rr;  // 2^30 / radius^2
@@ -192,9 +203,8 @@ struct TwirlRun {
 
 // Twirled values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
 // row dy below it, none of them in the disc where u < 8192.
-PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, int32_t dy, int32_t dx0, int32_t step,
-                                 int32_t n, uint32_t* __restrict out) {
-  const uint32_t* __restrict src = run.src;
+PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict src, int32_t dy,
+                                 int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
   const int32_t width = run.width, height = run.height, cx = run.cx, cy = run.cy;
   const uint32_t radius = run.radius, inv_rr = run.inv_rr, turn = run.turn;
   const bool clockwise = run.clockwise;
@@ -207,16 +217,14 @@ PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, int32_t dy, int32_t dx0, i
   // Coordinate and bilinear weight along one axis from the magnitude and sign of its sine or
   // cosine; see above for the split of T.
   const auto axis = [](int32_t centre, uint32_t h, uint32_t ml, uint32_t mag, bool neg,
-                       int32_t size, int32_t& lo, int32_t& hi, uint32_t& f) {
+                       int32_t& coord, uint32_t& f) {
     const uint32_t a = mag * h, b = mag * ml;
     const uint32_t t14 = (a + (b >> 7)) >> 7;
     const int32_t whole = static_cast<int32_t>(t14 >> 11);
     const uint32_t part = t14 & 2047;
     const bool exact = (((a << 7) + b) & 16383) == 0;
-    const int32_t c = neg ? centre - whole - 1 : centre + whole;
+    coord = neg ? centre - whole - 1 : centre + whole;
     f = neg ? 2048 - part - (exact ? 0 : 1) : part;
-    lo = c < 0 ? 0 : (c > size - 1 ? size - 1 : c);
-    hi = c + 1 < 0 ? 0 : (c + 1 > size - 1 ? size - 1 : c + 1);
   };
   for (int32_t i = 0; i < n; ++i) {
     const int32_t dx = dx0 + step * i;
@@ -243,21 +251,17 @@ PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, int32_t dy, int32_t dx0, i
     // Quarter q of the turn and the step r within it: the sine and cosine are SIN[r] and
     // SIN[4096 - r], swapped in odd quarters, with signs + + , + - , - - , - + .
     const uint32_t q = k >> 12, r = k & 4095;
-    const uint32_t near = static_cast<uint32_t>(SIN[r]), far = static_cast<uint32_t>(SIN[4096 - r]);
+    const uint32_t pair = kSinCos[r], near = pair & 0xFFFF, far = pair >> 16;
     const uint32_t s = (q & 1) != 0 ? far : near, c = (q & 1) != 0 ? near : far;
     const bool s_neg = q >= 2 && s != 0, c_neg = (q == 1 || q == 2) && c != 0;
     const uint32_t h = D >> 16, ml = ((D >> 8) & 255) + (D & 255);
-    int32_t xa = 0, xb = 0, ya = 0, yb = 0;
+    int32_t sx = 0, sy = 0;
     uint32_t fx = 0, fy = 0;
-    axis(cx, h, ml, s, s_neg, width, xa, xb, fx);
-    axis(cy, h, ml, c, c_neg, height, ya, yb, fy);
-    const int32_t top = ya * width, bottom = yb * width;
-    out[i] =
-        blend_bilinear(fx, fy, src[top + xa], src[top + xb], src[bottom + xa], src[bottom + xb]);
+    axis(cx, h, ml, s, s_neg, sx, fx);
+    axis(cy, h, ml, c, c_neg, sy, fy);
+    out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
   }
 }
-
-namespace {
 
 // First index i >= 0 with x0 + step * i >= x, for step 1 or 2.
 int64_t first_at_or_after(int64_t x0, int32_t step, int64_t x) {
@@ -283,12 +287,11 @@ int32_t fx_twirl(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
   // Pixels strictly inside the circle are warped.
   const uint64_t limit = static_cast<uint64_t>(rule.rr) - 1;
   const auto each = pfx::sample_each(src, width, height, rule);
-  if (radius > 4095) {
+  if (radius > 4095 || width < 2) {
     pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit, each);
     return PHOTOFX_SUCCESS;
   }
-  const pfx::TwirlRun run{src,
-                          width,
+  const pfx::TwirlRun run{width,
                           height,
                           cx,
                           cy,
@@ -311,9 +314,9 @@ int32_t fx_twirl(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
     }
     const int32_t ia = static_cast<int32_t>(a), ib = static_cast<int32_t>(b);
     const int32_t dx0 = x0 - cx, dy32 = static_cast<int32_t>(dy);
-    pfx::twirl_run(run, dy32, dx0, step, ia, out);
+    pfx::twirl_run(run, src, dy32, dx0, step, ia, out);
     each(y, x0 + step * ia, step, ib - ia, out + ia);
-    pfx::twirl_run(run, dy32, dx0 + step * ib, step, n - ib, out + ib);
+    pfx::twirl_run(run, src, dy32, dx0 + step * ib, step, n - ib, out + ib);
   };
   pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit, samples);
   return PHOTOFX_SUCCESS;

@@ -3,7 +3,9 @@
 // destination pixel finds its source position; everything around that lives here.
 #pragma once
 
+#include <bit>
 #include <cstdint>
+#include <cstring>
 
 #include "frame/frame.h"
 #include "frame/pixel.h"
@@ -38,6 +40,10 @@ constexpr uint32_t blend_bilinear(uint32_t fx, uint32_t fy, uint32_t p00, uint32
 // 2^29 / i truncated, for i = 1 ... 4095 (entry 0 is 0): the scale FATAN2 gives the shorter
 // component, for vectors whose components stay below 4096.
 extern const uint32_t kInverse29[4096];
+
+// SIN[r] in the low half and SIN[4096 - r] in the high half, for r = 0 ... 4095: the sine and
+// cosine of a twirl's turn from one read.
+extern const uint32_t kSinCos[4096];
 
 // Angle of the vector (b along 0 degrees, a along 90 degrees) in warp-angle units, from the
 // ATAN table of the ratio of the shorter to the longer component.
@@ -78,6 +84,39 @@ inline uint32_t sample_clamped(const uint32_t* src, int32_t width, int32_t heigh
   const size_t xa = hold(p.x, width), xb = hold(p.x + 1, width);
   const size_t ya = hold(p.y, height) * w, yb = hold(p.y + 1, height) * w;
   return blend_bilinear(p.fx, p.fy, src[ya + xa], src[ya + xb], src[yb + xa], src[yb + xb]);
+}
+
+// The pixels at columns c and c + 1 of the row starting at src[row], each held to the image (width
+// >= 2), from one 64-bit read of a pair of neighbours inside the row: at the left edge both are
+// column 0, at the right edge both the last column. One wide read instead of two narrow ones
+// matters where the reads are scattered (a vectorised loop gathers them one by one).
+inline void read_pair(const uint32_t* src, uint32_t row, int32_t c, int32_t width, uint32_t& left,
+                      uint32_t& right) {
+  // Clamped step by step, and the edges recognised by comparing with the clamped column: the
+  // compiler keeps that free of branches, so the read stays one gather.
+  int32_t j = c < 0 ? 0 : c;
+  j = j > width - 2 ? width - 2 : j;
+  uint64_t pair = 0;
+  std::memcpy(&pair, src + (row + static_cast<uint32_t>(j)), sizeof pair);
+  const bool little = std::endian::native == std::endian::little;
+  const uint32_t first = static_cast<uint32_t>(little ? pair : pair >> 32);
+  const uint32_t second = static_cast<uint32_t>(little ? pair >> 32 : pair);
+  left = c > j ? second : first;
+  right = c < j ? first : second;
+}
+
+// The bilinear blend around source pixel (sx, sy) with weights fx, fy, neighbours held to the
+// image as in sample_clamped (width >= 2; the image has at most kMaxPixels pixels, so the
+// offsets fit 32 bits).
+inline uint32_t sample_pairs(const uint32_t* src, int32_t width, int32_t height, int32_t sx,
+                             int32_t sy, uint32_t fx, uint32_t fy) {
+  const int32_t ya = sy < 0 ? 0 : (sy > height - 1 ? height - 1 : sy);
+  const int32_t yb = sy + 1 < 0 ? 0 : (sy + 1 > height - 1 ? height - 1 : sy + 1);
+  uint32_t p00 = 0, p10 = 0, p01 = 0, p11 = 0;
+  const uint32_t w = static_cast<uint32_t>(width);
+  read_pair(src, static_cast<uint32_t>(ya) * w, sx, width, p00, p10);
+  read_pair(src, static_cast<uint32_t>(yb) * w, sx, width, p01, p11);
+  return blend_bilinear(fx, fy, p00, p10, p01, p11);
 }
 
 // True when the blocks of na and nb words at a and b share any byte.
