@@ -240,14 +240,16 @@ PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict
     const uint32_t t0 = index == 2048 ? kAngle45 : tab;
     const uint32_t t = steep ? kAngle90 - t0 : t0;
     // The quadrants as base + t or base - t: (0, +), (360, -) below the centre, (180, -),
-    // (180, +) above it; 360 - 0 is a full turn, which the rule reads as 0.
+    // (180, +) above it.
     const bool right = dx >= 0;
     const uint32_t base = below ? (right ? 0 : kAngle360) : kAngle180;
-    const uint32_t theta0 = below == right ? base + t : base - t;
-    const uint32_t theta = theta0 == kAngle360 ? 0 : theta0;
+    const uint32_t theta = below == right ? base + t : base - t;
+    // theta (up to a full turn here) plus the twist lies in 0 ... 720 degrees, and a full turn
+    // is 16384 steps of 11520 exactly, so reducing the step index modulo 16384 is the same as
+    // reducing the angle modulo 360 degrees first.
     const uint32_t sum = theta + start + ((uint32_t{1} << 19) - rho) * signed_turn;
-    const uint32_t turned = sum >= kAngle360 ? sum - kAngle360 : sum;
-    const uint32_t k = turned / 11520;  // (turned / 360) >> 5
+    const uint32_t k = (sum / 11520) & 16383;  // ((sum mod 360 degrees) / 360) >> 5
+    static_assert(kAngle360 == 16384u * 11520u);
     // Quarter q of the turn and the step r within it: the sine and cosine are SIN[r] and
     // SIN[4096 - r], swapped in odd quarters, with signs + + , + - , - - , - + .
     const uint32_t q = k >> 12, r = k & 4095;
