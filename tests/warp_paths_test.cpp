@@ -79,6 +79,8 @@ TEST(WarpPaths, FastPathsMatchThePerPixelRules) {
       {"one row", kT, 40, 1, 39, 0, 30, -45, -43, kWhole, 1},
       {"one row", kS, 40, 1, 39, 0, 20, 70, 72, kWhole, 0},
       {"one pixel", kT, 1, 1, 0, 0, 1, 359, 360, kWhole, 1},
+      {"two columns, the narrowest paired reads", kT, 2, 23, 1, 11, 30, -181, -179, kWhole, 0},
+      {"two columns, the narrowest paired reads", kS, 2, 23, 0, 11, 20, 98, 100, kWhole, 0},
       {"radius 4095, the largest in 32 bits", kT, 8200, 3, 4100, 1, 4095, 359, 360, kWhole, 0},
       {"radius 4095, the largest in 32 bits", kT, 8200, 3, 4100, 1, 4095, -360, -359, kWhole, 0},
       {"radius 4096, in 64 bits", kT, 8200, 3, 4100, 1, 4096, 90, 90, kWhole, 1},
@@ -120,11 +122,16 @@ TEST(WarpPaths, RandomCirclesAndWindowsMatchThePerPixelRules) {
   }
 }
 
-TEST(WarpPaths, InverseTableIsTheTruncatedQuotient) {
+TEST(WarpPaths, DerivedTablesFollowTheirRules) {
   EXPECT_EQ(pfx::kInverse29[0], 0u);
   for (uint32_t i = 1; i < 4096; ++i) {
     ASSERT_LE(uint64_t{pfx::kInverse29[i]} * i, uint64_t{1} << 29) << i;
     ASSERT_GT(uint64_t{pfx::kInverse29[i] + 1} * i, uint64_t{1} << 29) << i;
+  }
+  // The packed sine and cosine must hold both halves whole.
+  for (int32_t r = 0; r < 4096; ++r) {
+    ASSERT_EQ(pfx::kSinCos[r] & 0xFFFFu, static_cast<uint32_t>(SIN[r])) << r;
+    ASSERT_EQ(pfx::kSinCos[r] >> 16, static_cast<uint32_t>(SIN[4096 - r])) << r;
   }
 }
 
