@@ -16,7 +16,15 @@ constexpr int32_t atan_entry(int32_t i) {
   return round_settled(atan_of(i / 2048.0) * (180.0 / kPi) * 524288.0);
 }
 
+constexpr uint32_t inverse29_entry(uint32_t i) { return i == 0 ? 0 : 0x20000000u / i; }
+
 }  // namespace
+
+namespace pfx {
+
+constinit const uint32_t kInverse29[4096] = {PFX_TABLE_4096(inverse29_entry, 0u)};
+
+}  // namespace pfx
 
 extern "C" {
 

@@ -7,6 +7,7 @@
 // coordinate pass 2^31 on large images at high levels, so positions are 64-bit.
 #include <cstdint>
 
+#include "frame/dispatch.h"
 #include "frame/frame.h"
 #include "photofx.h"
 #include "warp/warp.h"
@@ -62,6 +63,7 @@ constexpr int64_t rim_of(int32_t radius) {
   return static_cast<int64_t>((r2 >> 6) * 125u + (((r2 & 63u) * 125u + 32u) >> 6));
 }
 
+// The rule for one pixel, in 64-bit arithmetic with its divisions, for the largest circles.
 struct Sphericity {
   int64_t cx, cy, level;
   int64_t rim;
@@ -98,6 +100,88 @@ struct Sphericity {
   }
 };
 
+// Circles whose rim is below 2^26 (radius up to 5860) keep every coordinate offset below 8192,
+// and the rule then runs on 32-bit words without a division per pixel. The pull k depends on
+// the pixel only through the falloff index t (0 ... 256), so everything that takes a division is
+// worked out once per call for each t.
+//
+// Bulge: with x = cx + dx the rule's numerator is x 2^18 + cx k = cx den + dx 2^18, so
+// sx = cx + floor(dx 2^18 / den) and rx is the remainder of that floor division. For n = |dx|
+// the quotient comes from R = floor(2^37 / den): floor(n R / 2^19) falls short of
+// n 2^18 / den by less than n / 2^19 < 1 / 64 (as den >= 2^18), so it is the quotient or one
+// less, and one correction step makes it exact. n R < 2^13 * 2^19 fits 32 bits, as does
+// n 2^18. The weight's scale 2^30 / den is R >> 7 (floor(floor(a / b) / c) = floor(a / bc)).
+//
+// Pinch: k < 2^19 and |dx| < 2^13 make k dx a 33-bit product, but only k dx >> 7 is needed
+// (its whole pixels from bit 11 up, its weight below): with k = 128 kh + kl that is
+// kh dx + (kl dx >> 7), exactly, in 32 bits.
+struct SphereRun {
+  int32_t width, height, cx, cy;
+  uint32_t inv_rim;  // 2^30 / rim
+  bool pinch;
+  uint32_t den[257], recip[257];  // bulge: den and 2^37 / den for each t
+  int32_t k_hi[257], k_lo[257];   // pinch: k >> 7 and k & 127 for each t
+};
+
+// Warped values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
+// row dy below it.
+PFX_VECTOR_CLONES void sphericity_run(const SphereRun& run, const uint32_t* __restrict src,
+                                      int32_t dy, int32_t dx0, int32_t step, int32_t n,
+                                      uint32_t* __restrict out) {
+  const int32_t width = run.width, height = run.height, cx = run.cx, cy = run.cy;
+  const uint32_t inv_rim = run.inv_rim;
+  const uint32_t dy2 = static_cast<uint32_t>(dy * dy);
+  if (run.pinch) {
+    // Source at pos + k d / 2^18 along each axis.
+    const auto axis = [](int32_t pos, int32_t d, int32_t kh, int32_t kl, int32_t& coord,
+                         uint32_t& f) {
+      const int32_t p7 = kh * d + ((kl * d) >> 7);
+      coord = pos + (p7 >> 11);
+      f = static_cast<uint32_t>(p7 & 2047);
+    };
+    const int32_t y = cy + dy;
+    for (int32_t i = 0; i < n; ++i) {
+      const int32_t dx = dx0 + step * i;
+      const uint32_t d2 = static_cast<uint32_t>(dx * dx) + dy2;
+      const uint32_t t = (d2 * inv_rim) >> 22;
+      const int32_t kh = run.k_hi[t], kl = run.k_lo[t];
+      int32_t sx = 0, sy = 0;
+      uint32_t fx = 0, fy = 0;
+      axis(cx + dx, dx, kh, kl, sx, fx);
+      axis(y, dy, kh, kl, sy, fy);
+      out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
+    }
+    return;
+  }
+  // Source at centre + floor(d 2^18 / den) along each axis, the remainder giving the weight.
+  const auto axis = [](int32_t centre, int32_t d, uint32_t den, uint32_t recip, int32_t& coord,
+                       uint32_t& f) {
+    const uint32_t m = static_cast<uint32_t>(d < 0 ? -d : d);
+    uint32_t q = (m * recip) >> 19;
+    uint32_t r = (m << 18) - q * den;
+    q = r >= den ? q + 1 : q;
+    r = r >= den ? r - den : r;
+    // For d < 0 the quotient is negated and, when inexact, floored one further. Written as
+    // arithmetic on the sign rather than a choice, because d is the same for a whole row on the
+    // y axis and the vectoriser cannot choose by a value outside the loop.
+    const int32_t neg = d < 0 ? 1 : 0;
+    const int32_t back = (r != 0 ? 1 : 0) & neg;
+    coord = centre + ((static_cast<int32_t>(q) ^ -neg) + neg) - back;
+    f = ((recip >> 7) * (back != 0 ? den - r : r)) >> 19;
+  };
+  for (int32_t i = 0; i < n; ++i) {
+    const int32_t dx = dx0 + step * i;
+    const uint32_t d2 = static_cast<uint32_t>(dx * dx) + dy2;
+    const uint32_t t = (d2 * inv_rim) >> 22;
+    const uint32_t den = run.den[t], recip = run.recip[t];
+    int32_t sx = 0, sy = 0;
+    uint32_t fx = 0, fy = 0;
+    axis(cx, dx, den, recip, sx, fx);
+    axis(cy, dy, den, recip, sy, fy);
+    out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
+  }
+}
+
 }  // namespace
 }  // namespace pfx
 
@@ -108,9 +192,37 @@ int32_t fx_sphericity(const uint32_t* src, uint32_t* dst, int32_t width, int32_t
                       int32_t top, int32_t bottom, uint32_t fast) {
   if (!pfx::warp_args_ok(src, dst, width, height, cx, cy)) return PHOTOFX_INVALID_ARGUMENT;
   if (radius <= 0 || level < -100 || level > 100) return PHOTOFX_INVALID_ARGUMENT;
-  pfx::copy_image(src, dst, pfx::pixel_count(width, height));
-  pfx::warp_window(src, dst, width, height, {left, right, top, bottom}, fast != 0,
-                   pfx::Sphericity(cx, cy, radius, level));
+  const pfx::Sphericity rule(cx, cy, radius, level);
+  const pfx::Rect window{left, right, top, bottom};
+  const uint64_t limit = static_cast<uint64_t>(rule.rim);
+  if (rule.rim >= (int64_t{1} << 26) || width < 2) {
+    pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit,
+                     pfx::sample_each(src, width, height, rule));
+    return PHOTOFX_SUCCESS;
+  }
+  pfx::SphereRun run{};
+  run.width = width;
+  run.height = height;
+  run.cx = cx;
+  run.cy = cy;
+  run.inv_rim = static_cast<uint32_t>(rule.inv_rim);
+  run.pinch = level < 0;
+  for (int32_t t = 0; t <= 256; ++t) {
+    const int64_t e = pfx::falloff(t) >> 7;
+    if (level < 0) {
+      const int64_t k = (30 * -int64_t{level} * e) >> 12;
+      run.k_hi[t] = static_cast<int32_t>(k >> 7);
+      run.k_lo[t] = static_cast<int32_t>(k & 127);
+    } else {
+      const int64_t den = ((75 * int64_t{level} * e) >> 12) + pfx::kPosOne;
+      run.den[t] = static_cast<uint32_t>(den);
+      run.recip[t] = static_cast<uint32_t>((int64_t{1} << 37) / den);
+    }
+  }
+  pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit,
+                   [&](int32_t y, int32_t x0, int32_t step, int32_t n, uint32_t* out) {
+                     pfx::sphericity_run(run, src, y - cy, x0 - cx, step, n, out);
+                   });
   return PHOTOFX_SUCCESS;
 }
 

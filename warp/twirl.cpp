@@ -9,6 +9,7 @@
 #include <cstdint>
 
 #include "frame/frame.h"
+#include "frame/dispatch.h"
 #include "frame/table.h"
 #include "photofx.h"
 #include "warp/const_math.h"
@@ -16,29 +17,13 @@
 
 namespace {
 
-// Integer square root: the largest r with r * r <= n.
-constexpr uint64_t isqrt(uint64_t n) {
-  uint64_t root = 0, bit = uint64_t{1} << 62;
-  while (bit > n) bit >>= 2;
-  while (bit != 0) {
-    if (n >= root + bit) {
-      n -= root + bit;
-      root = (root >> 1) + bit;
-    } else {
-      root >>= 1;
-    }
-    bit >>= 2;
-  }
-  return root;
-}
-
 // 256 * sqrt(u) rounded to nearest, in integers: that is the nearest integer to sqrt(n) with
 // n = 65536 u. With r = isqrt(n), sqrt(n) > r + 1/2 exactly when n > r^2 + r (as
 // (r + 1/2)^2 = r^2 + r + 1/4), and no square root of an integer is ever a half, so there are
 // no ties to settle.
 constexpr int32_t root_entry(uint32_t u) {
   const uint64_t n = uint64_t{u} << 16;
-  const uint64_t r = isqrt(n);
+  const uint64_t r = pfx::isqrt(n);
   return static_cast<int32_t>(n - r * r > r ? r + 1 : r);
 }
 
@@ -91,6 +76,20 @@ constinit const int32_t SIN[4097] = {PFX_TABLE_4096(sin_entry, 0), sin_entry(409
 
 }  // extern "C"
 
+namespace {
+
+constexpr uint32_t sin_cos_entry(int32_t r) {
+  return static_cast<uint32_t>(sin_entry(r)) | static_cast<uint32_t>(sin_entry(4096 - r)) << 16;
+}
+
+}  // namespace
+
+namespace pfx {
+
+constinit const uint32_t kSinCos[4096] = {PFX_TABLE_4096(sin_cos_entry, 0)};
+
+}  // namespace pfx
+
 namespace pfx {
 namespace {
 
@@ -131,6 +130,8 @@ constexpr AxisOffset offset_along(int64_t centre, int64_t D, int32_t v) {
   return {centre - I - 1, kOffsetOne - F};
 }
 
+// The rule for one pixel, in 64-bit arithmetic: the whole story for radii above 4095, and the
+// pixels nearest the centre (where the square root comes from the fine tables) otherwise.
 struct Twirl {
   int64_t cx, cy, radius, rr;
   int64_t inv_rr;  // reciprocal of rr scaled by 2^(22 + inv_shift)
@@ -180,6 +181,95 @@ struct Twirl {
   }
 };
 
+// Radii up to 4095 keep every quantity of the rule below 2^32, so the pixels away from the centre
+// take the same steps on 32-bit words, with the two divisions of a pixel replaced: 2^29 / hi of
+// the arctangent read from kInverse29, and the sine index (turned / 360) >> 5 written as the
+// single division by the constant 11520, which the compiler turns into a multiply. That leaves
+// straight-line code over a run of pixels, which vectorises (table reads become gathers).
+//
+// The offset T = S * (128 h + m + l) of the rule reaches 2^37, but only T >> 14 (which holds
+// the whole pixels I = T >> 25 and the weight bits) and whether T's low 14 bits are zero are
+// needed. With A = S h < 2^30 and B = S (m + l) < 2^24, T = 128 A + B, and
+//   T >> 14 = (A + (B >> 7)) >> 7
+// exactly (the bits of B below 7 cannot carry into bit 14), while T's low 14 bits are those of
+// the wrapped 32-bit sum (A << 7) + B.
+struct TwirlRun {
+  int32_t width, height, cx, cy;
+  uint32_t radius;  // 1 ... 4095
+  uint32_t inv_rr;  // 2^30 / radius^2
+  uint32_t turn;    // |angle|
+  bool clockwise;
+};
+
+// Twirled values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
+// row dy below it, none of them in the disc where u < 8192.
+PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict src, int32_t dy,
+                                 int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
+  const int32_t width = run.width, height = run.height, cx = run.cx, cy = run.cy;
+  const uint32_t radius = run.radius, inv_rr = run.inv_rr, turn = run.turn;
+  const bool clockwise = run.clockwise;
+  const uint32_t ax = static_cast<uint32_t>(dy < 0 ? -dy : dy);  // |b| of FATAN2(dx, dy)
+  const uint32_t dy2 = ax * ax;
+  const bool below = dy > 0;
+  // theta + twist, or theta + 360 degrees - twist when clockwise, as one wrapping sum: the true
+  // value lies in 0 ... 720 degrees, so the word holds it exactly.
+  const uint32_t start = clockwise ? kAngle360 : 0, signed_turn = clockwise ? 0u - turn : turn;
+  // Coordinate and bilinear weight along one axis from the magnitude and sign of its sine or
+  // cosine; see above for the split of T.
+  const auto axis = [](int32_t centre, uint32_t h, uint32_t ml, uint32_t mag, bool neg,
+                       int32_t& coord, uint32_t& f) {
+    const uint32_t a = mag * h, b = mag * ml;
+    const uint32_t t14 = (a + (b >> 7)) >> 7;
+    const int32_t whole = static_cast<int32_t>(t14 >> 11);
+    const uint32_t part = t14 & 2047;
+    const bool exact = (((a << 7) + b) & 16383) == 0;
+    coord = neg ? centre - whole - 1 : centre + whole;
+    f = neg ? 2048 - part - (exact ? 0 : 1) : part;
+  };
+  for (int32_t i = 0; i < n; ++i) {
+    const int32_t dx = dx0 + step * i;
+    const uint32_t ay = static_cast<uint32_t>(dx < 0 ? -dx : dx);
+    const uint32_t d2 = ay * ay + dy2;
+    const uint32_t rho = static_cast<uint32_t>(SQRT_STEP_4[((d2 * inv_rr) >> 8) >> 6]);
+    const uint32_t D = radius * rho;
+    // FATAN2(dx, dy); the centre, where both are 0, is never here.
+    const bool steep = ay > ax;
+    const uint32_t lo = steep ? ax : ay, hi = steep ? ay : ax;
+    const uint32_t index = (lo * kInverse29[hi]) >> 18;
+    const uint32_t tab = static_cast<uint32_t>(ATAN[index & 2047]);
+    const uint32_t t0 = index == 2048 ? kAngle45 : tab;
+    const uint32_t t = steep ? kAngle90 - t0 : t0;
+    // The quadrants as base + t or base - t: (0, +), (360, -) below the centre, (180, -),
+    // (180, +) above it.
+    const bool right = dx >= 0;
+    const uint32_t base = below ? (right ? 0 : kAngle360) : kAngle180;
+    const uint32_t theta = below == right ? base + t : base - t;
+    // theta (up to a full turn here) plus the twist lies in 0 ... 720 degrees, and a full turn
+    // is 16384 steps of 11520 exactly, so reducing the step index modulo 16384 is the same as
+    // reducing the angle modulo 360 degrees first.
+    const uint32_t sum = theta + start + ((uint32_t{1} << 19) - rho) * signed_turn;
+    const uint32_t k = (sum / 11520) & 16383;  // ((sum mod 360 degrees) / 360) >> 5
+    static_assert(kAngle360 == 16384u * 11520u);
+    // Quarter q of the turn and the step r within it: the sine and cosine are SIN[r] and
+    // SIN[4096 - r], swapped in odd quarters, with signs + + , + - , - - , - + .
+    const uint32_t q = k >> 12, r = k & 4095;
+    const uint32_t pair = kSinCos[r], near = pair & 0xFFFF, far = pair >> 16;
+    const uint32_t s = (q & 1) != 0 ? far : near, c = (q & 1) != 0 ? near : far;
+    const bool s_neg = q >= 2 && s != 0, c_neg = (q == 1 || q == 2) && c != 0;
+    const uint32_t h = D >> 16, ml = ((D >> 8) & 255) + (D & 255);
+    int32_t sx = 0, sy = 0;
+    uint32_t fx = 0, fy = 0;
+    axis(cx, h, ml, s, s_neg, sx, fx);
+    axis(cy, h, ml, c, c_neg, sy, fy);
+    out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
+  }
+}
+
+// First index i >= 0 with x0 + step * i >= x, for step 1 or 2.
+int64_t first_at_or_after(int64_t x0, int32_t step, int64_t x) {
+  return x <= x0 ? 0 : (x - x0 + step - 1) / step;
+}
+
 }  // namespace
 }  // namespace pfx
 
@@ -190,10 +280,47 @@ int32_t fx_twirl(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
                  int32_t top, int32_t bottom, uint32_t fast) {
   if (!pfx::warp_args_ok(src, dst, width, height, cx, cy)) return PHOTOFX_INVALID_ARGUMENT;
   if (radius < 1 || angle < -360 || angle > 360) return PHOTOFX_INVALID_ARGUMENT;
-  pfx::copy_image(src, dst, pfx::pixel_count(width, height));
-  if (angle == 0) return PHOTOFX_SUCCESS;
-  pfx::warp_window(src, dst, width, height, {left, right, top, bottom}, fast != 0,
-                   pfx::Twirl(cx, cy, radius, angle));
+  if (angle == 0) {
+    pfx::copy_image(src, dst, pfx::pixel_count(width, height));
+    return PHOTOFX_SUCCESS;
+  }
+  const pfx::Twirl rule(cx, cy, radius, angle);
+  const pfx::Rect window{left, right, top, bottom};
+  // Pixels strictly inside the circle are warped.
+  const uint64_t limit = static_cast<uint64_t>(rule.rr) - 1;
+  const auto each = pfx::sample_each(src, width, height, rule);
+  if (radius > 4095 || width < 2) {
+    pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit, each);
+    return PHOTOFX_SUCCESS;
+  }
+  const pfx::TwirlRun run{width,
+                          height,
+                          cx,
+                          cy,
+                          static_cast<uint32_t>(radius),
+                          static_cast<uint32_t>(rule.inv_rr),
+                          static_cast<uint32_t>(rule.turn),
+                          rule.clockwise};
+  // The disc u < 8192, where the square root comes from the finer tables, is d2 < near.
+  const int64_t near = ((int64_t{1} << 21) + rule.inv_rr - 1) / rule.inv_rr;
+  const auto samples = [&](int32_t y, int32_t x0, int32_t step, int32_t n, uint32_t* out) {
+    const int64_t dy = int64_t{y} - cy;
+    int64_t a = n, b = n;  // samples a ... b - 1 lie in the disc
+    if (dy * dy < near) {
+      const int64_t half =
+          static_cast<int64_t>(pfx::isqrt(static_cast<uint64_t>(near - 1 - dy * dy)));
+      a = pfx::first_at_or_after(x0, step, int64_t{cx} - half);
+      b = pfx::first_at_or_after(x0, step, int64_t{cx} + half + 1);
+      if (a > n) a = n;
+      if (b > n) b = n;
+    }
+    const int32_t ia = static_cast<int32_t>(a), ib = static_cast<int32_t>(b);
+    const int32_t dx0 = x0 - cx, dy32 = static_cast<int32_t>(dy);
+    pfx::twirl_run(run, src, dy32, dx0, step, ia, out);
+    each(y, x0 + step * ia, step, ib - ia, out + ia);
+    pfx::twirl_run(run, src, dy32, dx0 + step * ib, step, n - ib, out + ib);
+  };
+  pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit, samples);
   return PHOTOFX_SUCCESS;
 }
 

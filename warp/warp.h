@@ -3,7 +3,9 @@
 // destination pixel finds its source position; everything around that lives here.
 #pragma once
 
+#include <bit>
 #include <cstdint>
+#include <cstring>
 
 #include "frame/frame.h"
 #include "frame/pixel.h"
@@ -34,6 +36,14 @@ constexpr uint32_t blend_bilinear(uint32_t fx, uint32_t fy, uint32_t p00, uint32
   };
   return pack(0xFF000000u, blend(red_of), blend(green_of), blend(blue_of));
 }
+
+// 2^29 / i truncated, for i = 1 ... 4095 (entry 0 is 0): the scale FATAN2 gives the shorter
+// component, for vectors whose components stay below 4096.
+extern const uint32_t kInverse29[4096];
+
+// SIN[r] in the low half and SIN[4096 - r] in the high half, for r = 0 ... 4095: the sine and
+// cosine of a twirl's turn from one read.
+extern const uint32_t kSinCos[4096];
 
 // Angle of the vector (b along 0 degrees, a along 90 degrees) in warp-angle units, from the
 // ATAN table of the ratio of the shorter to the longer component.
@@ -76,6 +86,39 @@ inline uint32_t sample_clamped(const uint32_t* src, int32_t width, int32_t heigh
   return blend_bilinear(p.fx, p.fy, src[ya + xa], src[ya + xb], src[yb + xa], src[yb + xb]);
 }
 
+// The pixels at columns c and c + 1 of the row starting at src[row], each held to the image (width
+// >= 2), from one 64-bit read of a pair of neighbours inside the row: at the left edge both are
+// column 0, at the right edge both the last column. One wide read instead of two narrow ones
+// matters where the reads are scattered (a vectorised loop gathers them one by one).
+inline void read_pair(const uint32_t* src, uint32_t row, int32_t c, int32_t width, uint32_t& left,
+                      uint32_t& right) {
+  // Clamped step by step, and the edges recognised by comparing with the clamped column: the
+  // compiler keeps that free of branches, so the read stays one gather.
+  int32_t j = c < 0 ? 0 : c;
+  j = j > width - 2 ? width - 2 : j;
+  uint64_t pair = 0;
+  std::memcpy(&pair, src + (row + static_cast<uint32_t>(j)), sizeof pair);
+  const bool little = std::endian::native == std::endian::little;
+  const uint32_t first = static_cast<uint32_t>(little ? pair : pair >> 32);
+  const uint32_t second = static_cast<uint32_t>(little ? pair >> 32 : pair);
+  left = c > j ? second : first;
+  right = c < j ? first : second;
+}
+
+// The bilinear blend around source pixel (sx, sy) with weights fx, fy, neighbours held to the
+// image as in sample_clamped (width >= 2; the image has at most kMaxPixels pixels, so the
+// offsets fit 32 bits).
+inline uint32_t sample_pairs(const uint32_t* src, int32_t width, int32_t height, int32_t sx,
+                             int32_t sy, uint32_t fx, uint32_t fy) {
+  const int32_t ya = sy < 0 ? 0 : (sy > height - 1 ? height - 1 : sy);
+  const int32_t yb = sy + 1 < 0 ? 0 : (sy + 1 > height - 1 ? height - 1 : sy + 1);
+  uint32_t p00 = 0, p10 = 0, p01 = 0, p11 = 0;
+  const uint32_t w = static_cast<uint32_t>(width);
+  read_pair(src, static_cast<uint32_t>(ya) * w, sx, width, p00, p10);
+  read_pair(src, static_cast<uint32_t>(yb) * w, sx, width, p01, p11);
+  return blend_bilinear(fx, fy, p00, p10, p01, p11);
+}
+
 // True when the blocks of na and nb words at a and b share any byte.
 inline bool buffers_overlap(const uint32_t* a, int64_t na, const uint32_t* b, int64_t nb) {
   const uintptr_t pa = reinterpret_cast<uintptr_t>(a), pb = reinterpret_cast<uintptr_t>(b);
@@ -94,40 +137,109 @@ inline bool warp_args_ok(const uint32_t* src, const uint32_t* dst, int32_t width
   return n <= kMaxPixels && !buffers_overlap(src, n, dst, n);
 }
 
-// Visits the window (clipped to the image) rows top to bottom, columns left to right. For each
-// pixel, locate(x, y, point) says whether it is warped and where it samples the source. In fast
-// mode a warped pixel's value also fills the pixels right of it, below it and diagonally, as
-// far as they lie inside the window, and the scan skips the pixel to its right; rows advance by
-// two. Neighbours are always read from src, which the caller has copied into dst beforehand.
-template <class Locate>
-void warp_window(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height, Rect window,
-                 bool fast, Locate&& locate) {
+// Largest r with r * r <= n.
+constexpr uint64_t isqrt(uint64_t n) {
+  uint64_t root = 0, bit = uint64_t{1} << 62;
+  while (bit > n) bit >>= 2;
+  while (bit != 0) {
+    if (n >= root + bit) {
+      n -= root + bit;
+      root = (root >> 1) + bit;
+    } else {
+      root >>= 1;
+    }
+    bit >>= 2;
+  }
+  return root;
+}
+
+// Runs a circle warp over the window (clipped to the image) and copies every pixel it does not
+// warp from src, so dst needs no copy beforehand. A pixel is warped when its squared distance
+// from the centre is at most `limit`; on each row those pixels form one run of columns (the
+// circle's chord), found with an integer square root, so the pixels outside the circle cost
+// no test and are copied in blocks.
+//
+// samples(y, x0, step, n, out) fills out[i] with the warped value of pixel (x0 + step * i, y),
+// each inside the circle. Fast mode samples every second column of the chord on every second
+// row and fills the 2 x 2 block right of and below each sample, as far as it lies inside the
+// window. Neighbours are read from src only, so the order of the writes does not matter.
+template <class Samples>
+void warp_circle(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height, Rect window,
+                 bool fast, int32_t cx, int32_t cy, uint64_t limit, Samples&& samples) {
   const Rect w = clip_to_image(window, width, height);
   const size_t stride = static_cast<size_t>(width);
+  const auto copy_rows = [&](int32_t from, int32_t to) {
+    if (to <= from) return;
+    const size_t at = static_cast<size_t>(from) * stride;
+    fx_memcpy(dst + at, src + at,
+              static_cast<uint32_t>(static_cast<size_t>(to - from) * stride * 4));
+  };
+  // Row y apart from columns first ... last.
+  const auto copy_around = [&](int32_t y, int32_t first, int32_t last) {
+    const size_t at = static_cast<size_t>(y) * stride;
+    fx_memcpy(dst + at, src + at, static_cast<uint32_t>(first) * 4);
+    const size_t after = static_cast<size_t>(last) + 1;
+    fx_memcpy(dst + at + after, src + at + after, static_cast<uint32_t>((stride - after) * 4));
+  };
+  int32_t settled = 0;  // rows above this one are final in dst
   const int32_t row_step = fast ? 2 : 1;
-  for (int32_t y = w.top; y <= w.bottom; y += row_step) {
+  for (int32_t y = w.top; y <= w.bottom && w.left <= w.right; y += row_step) {
+    const int64_t dy = int64_t{y} - cy;
+    const uint64_t dy2 = static_cast<uint64_t>(dy * dy);
+    if (dy2 > limit) continue;
+    const int64_t half = static_cast<int64_t>(isqrt(limit - dy2));
+    const int64_t first64 = int64_t{cx} - half < w.left ? w.left : int64_t{cx} - half;
+    const int64_t last64 = int64_t{cx} + half > w.right ? w.right : int64_t{cx} + half;
+    if (first64 > last64) continue;
+    const int32_t first = static_cast<int32_t>(first64), last = static_cast<int32_t>(last64);
+    copy_rows(settled, y);
     uint32_t* row = dst + static_cast<size_t>(y) * stride;
-    const bool below = fast && y + 1 <= w.bottom;
-    for (int32_t x = w.left; x <= w.right;) {
-      SourcePoint p{};
-      if (!locate(x, y, p)) {
-        ++x;
-        continue;
-      }
-      const uint32_t value = sample_clamped(src, width, height, p);
-      const size_t i = static_cast<size_t>(x);
-      row[i] = value;
-      if (!fast) {
-        ++x;
-        continue;
-      }
-      const bool right = x + 1 <= w.right;
-      if (right) row[i + 1] = value;
-      if (below) row[stride + i] = value;
-      if (below && right) row[stride + i + 1] = value;
-      x += 2;
+    if (!fast) {
+      copy_around(y, first, last);
+      samples(y, first, 1, last - first + 1, row + first);
+      settled = y + 1;
+      continue;
     }
+    const int32_t n = (last - first) / 2 + 1;
+    const int32_t end = first + 2 * (n - 1) + 1 > w.right ? w.right : first + 2 * (n - 1) + 1;
+    const bool below = y + 1 <= w.bottom;
+    copy_around(y, first, end);
+    if (below) copy_around(y + 1, first, end);
+    constexpr int32_t kChunk = 512;
+    uint32_t value[kChunk];
+    for (int32_t done = 0; done < n; done += kChunk) {
+      const int32_t m = n - done < kChunk ? n - done : kChunk;
+      const int32_t x0 = first + 2 * done;
+      samples(y, x0, 2, m, value);
+      for (int32_t i = 0; i < m; ++i) {
+        const size_t x = static_cast<size_t>(x0) + 2 * static_cast<size_t>(i);
+        row[x] = value[i];
+        if (below) row[stride + x] = value[i];
+      }
+      // The right half of each block, where the window reaches it.
+      const int32_t whole = x0 + 2 * (m - 1) + 1 <= w.right ? m : m - 1;
+      for (int32_t i = 0; i < whole; ++i) {
+        const size_t x = static_cast<size_t>(x0) + 2 * static_cast<size_t>(i) + 1;
+        row[x] = value[i];
+        if (below) row[stride + x] = value[i];
+      }
+    }
+    settled = y + (below ? 2 : 1);
   }
+  copy_rows(settled, height);
+}
+
+// Samples for warp_circle from a per-pixel rule: locate(x, y, point) gives the source point of a
+// warped pixel, which is then sampled with clamping.
+template <class Locate>
+auto sample_each(const uint32_t* src, int32_t width, int32_t height, const Locate& locate) {
+  return [=](int32_t y, int32_t x0, int32_t step, int32_t n, uint32_t* out) {
+    for (int32_t i = 0; i < n; ++i) {
+      SourcePoint p{};
+      locate(x0 + step * i, y, p);
+      out[i] = sample_clamped(src, width, height, p);
+    }
+  };
 }
 
 }  // namespace pfx
