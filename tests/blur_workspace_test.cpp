@@ -71,7 +71,9 @@ TEST(BlurReduction, ShiftAndScaleDown) {
   EXPECT_EQ(depth, before);
 }
 
-// (The interpolation back to full size, edges included, is pinned by the blur goldens.)
+// Compositing changes only pixels both selected and blurred (depth nonzero), and nothing for
+// working images under two samples a side. (The interpolation itself, edges included, is pinned
+// by the blur goldens.)
 TEST(BlurComposite, DepthMaskAndWorkingSizeDecideWhatChanges) {
   constexpr int32_t W = 24, H = 20, SW = 6, SH = 5;
   const Pixels src = pfx::test::random_image(W, H, 10);
