@@ -1,11 +1,13 @@
-// Sphericity: the falloff table, the fixed points of the warp (level 0, the centre, the rim),
-// the argument checks, the window and fast mode, and positions on images wide enough that 32-bit
-// arithmetic would overflow.
+// Sphericity: the fixed points of the warp (level 0, the centre, the rim), the argument checks,
+// the window and fast mode clipped to the image, and positions on images wide enough that 32-bit
+// arithmetic would overflow. The falloff table is given by its values; the warp tables' golden
+// digest pins it.
 #include <gtest/gtest.h>
 
 #include <cstdint>
 #include <cstdlib>
 
+#include "frame/frame.h"
 #include "photofx.h"
 #include "support/images.h"
 
@@ -27,157 +29,92 @@ struct Warped {
   Pixels px;
 };
 
+// The whole image is the window unless one is given.
 Warped sphericity(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
-                  int32_t level, int32_t left, int32_t right, int32_t top, int32_t bottom,
-                  uint32_t fast = 0) {
+                  int32_t level, pfx::Rect win = {0, -1, 0, -1}, uint32_t fast = 0) {
+  if (win.right < 0 && win.left == 0) win = {0, w - 1, 0, h - 1};
   Warped r{0, Pixels(src.size(), 0xDEADBEEFu)};
-  r.code = fx_sphericity(src.data(), r.px.data(), w, h, cx, cy, radius, level, left, right, top,
-                         bottom, fast);
+  r.code = fx_sphericity(src.data(), r.px.data(), w, h, cx, cy, radius, level, win.left, win.right,
+                         win.top, win.bottom, fast);
   return r;
 }
 
-// The whole image as the window.
-Warped sphericity(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
-                  int32_t level, uint32_t fast = 0) {
-  return sphericity(src, w, h, cx, cy, radius, level, 0, w - 1, 0, h - 1, fast);
-}
-
-TEST(Sphericity, FalloffTableHasItsGivenShape) {
-  EXPECT_EQ(EXP_n7[0], 66974646);
-  EXPECT_EQ(EXP_n7[128], 2019149);
-  EXPECT_EQ(EXP_n7[255], 18969);
-  // Two irregularities of the curve that are part of it: a rise at 205 and a drop after 230.
-  EXPECT_GT(EXP_n7[205], EXP_n7[204]);
-  EXPECT_EQ(EXP_n7[231], 85473);
-  int64_t sum = 0;
-  for (int32_t v : EXP_n7) sum += v;
-  EXPECT_EQ(sum, 2483496352);
-}
-
-TEST(Sphericity, LevelZeroKeepsColoursAndMakesTheCircleOpaque) {
+// Level 0 keeps every colour and makes the circle (d2 up to radius^2 * 500 / 256, the rim
+// included) opaque while pixels beyond it are copied; at every level the centre samples itself.
+TEST(Sphericity, LevelZeroKeepsColoursAndTheCentreMapsToItself) {
   const int32_t w = 23, h = 19, cx = 11, cy = 8, radius = 6;
   const Pixels src = pfx::test::random_image(w, h, 5);
   const Warped r = sphericity(src, w, h, cx, cy, radius, 0);
   ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
   const int32_t rim = (radius * radius * 500 + 128) >> 8;
-  for (int32_t y = 0; y < h; ++y) {
-    for (int32_t x = 0; x < w; ++x) {
-      const size_t i = static_cast<size_t>(y * w + x);
-      const bool inside = (x - cx) * (x - cx) + (y - cy) * (y - cy) <= rim;
-      EXPECT_EQ(r.px[i], inside ? (src[i] | kOpaque) : src[i]) << x << "," << y;
-    }
+  for (size_t i = 0; i < src.size(); ++i) {
+    const int32_t x = int32_t(i % w), y = int32_t(i / w);
+    const bool inside = (x - cx) * (x - cx) + (y - cy) * (y - cy) <= rim;
+    ASSERT_EQ(r.px[i], inside ? (src[i] | kOpaque) : src[i]) << x << "," << y;
   }
-}
-
-TEST(Sphericity, CentreMapsToItselfAtEveryLevel) {
-  const Pixels src = pfx::test::random_image(15, 15, 6);
   for (int32_t level : {-100, -37, -1, 1, 50, 100}) {
-    const Warped r = sphericity(src, 15, 15, 7, 6, 5, level);
-    EXPECT_EQ(r.px[6 * 15 + 7], src[6 * 15 + 7] | kOpaque) << level;
+    EXPECT_EQ(sphericity(src, w, h, cx, cy, 5, level).px[cy * w + cx], src[cy * w + cx] | kOpaque)
+        << level;
   }
 }
 
-TEST(Sphericity, RimIsWarpedAndReadsAZeroFalloffWhilePixelsBeyondItAreCopied) {
-  const Pixels src = translucent_image(30, 30, 7);
-  const auto at = [](const Pixels& px, int32_t x, int32_t y) { return px[y * 30 + x]; };
-  // Radius 1 puts the rim at d2 = 2, where the falloff index is exactly 256: k = 0, so the pixel
-  // samples itself at either extreme level. d2 = 1 lies inside, d2 = 4 outside.
-  for (int32_t level : {-100, 100}) {
-    const Warped r = sphericity(src, 30, 30, 10, 10, 1, level);
-    EXPECT_EQ(at(r.px, 11, 11), at(src, 11, 11) | kOpaque);
-    EXPECT_EQ(at(r.px, 9, 9), at(src, 9, 9) | kOpaque);
-    EXPECT_EQ(at(r.px, 11, 10) >> 24, 0xFFu);
-    EXPECT_EQ(at(r.px, 12, 10), at(src, 12, 10));
-  }
-  // Radius 8: rim 125 = 10^2 + 5^2 is warped, 11^2 + 3^2 = 130 is not.
-  const Warped r = sphericity(src, 30, 30, 12, 12, 8, 80);
-  EXPECT_EQ(at(r.px, 22, 17) >> 24, 0xFFu);
-  EXPECT_EQ(at(r.px, 2, 7) >> 24, 0xFFu);
-  EXPECT_EQ(at(r.px, 23, 15), at(src, 23, 15));
-  EXPECT_EQ(at(r.px, 1, 9), at(src, 1, 9));
-}
-
+// Radii below 1, levels beyond +-100, centres outside the image, missing buffers and one buffer
+// as source and destination (the warp would read pixels it had already moved) are refused.
 TEST(Sphericity, BadArgumentsWriteNothing) {
-  const Pixels src = pfx::test::random_image(8, 6, 8);
-  Pixels dst(src.size(), 0xDEADBEEFu);
-  const Pixels before = dst;
-  const auto call = [&](const uint32_t* s, uint32_t* d, int32_t cx, int32_t cy, int32_t radius,
-                        int32_t level) {
-    return fx_sphericity(s, d, 8, 6, cx, cy, radius, level, 0, 7, 0, 5, 0);
+  Pixels src = pfx::test::random_image(8, 6, 8);
+  const Pixels original = src, untouched(src.size(), 0xDEADBEEFu);
+  Pixels dst = untouched;
+  const struct {
+    const uint32_t* s;
+    uint32_t* d;
+    int32_t cx, cy, radius, level;
+  } cases[] = {
+      // clang-format off
+      {src.data(), dst.data(), 4, 3, 0, 50},   {src.data(), dst.data(), 4, 3, -5, 50},
+      {src.data(), dst.data(), 4, 3, 3, 101},  {src.data(), dst.data(), 4, 3, 3, -101},
+      {src.data(), dst.data(), -1, 3, 3, 50},  {src.data(), dst.data(), 8, 3, 3, 50},
+      {src.data(), dst.data(), 4, 6, 3, 50},   {src.data(), dst.data(), 4, -1, 3, 50},
+      {nullptr, dst.data(), 4, 3, 3, 50},      {src.data(), nullptr, 4, 3, 3, 50},
+      {src.data(), src.data(), 4, 3, 3, 50},
+      // clang-format on
   };
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 0, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, -5, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, 101), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, -101), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), -1, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 8, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 6, 3, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, -1, 3, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(nullptr, dst.data(), 4, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), nullptr, 4, 3, 3, 50), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(dst, before);
+  for (const auto& c : cases) {
+    EXPECT_EQ(fx_sphericity(c.s, c.d, 8, 6, c.cx, c.cy, c.radius, c.level, 0, 7, 0, 5, 0),
+              PHOTOFX_INVALID_ARGUMENT)
+        << &c - cases;
+  }
   runSphericity(src.data(), dst.data(), 8, 6, 4, 3, 3, 200, 0, 7, 0, 5, 0);
-  EXPECT_EQ(dst, before);
-  // In place the warp would read pixels it had already moved: refused.
-  Pixels same = src;
-  EXPECT_EQ(fx_sphericity(same.data(), same.data(), 8, 6, 4, 3, 3, 50, 0, 7, 0, 5, 0),
-            PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(same, src);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, -100), PHOTOFX_SUCCESS);
+  EXPECT_EQ(dst, untouched);
+  EXPECT_EQ(src, original);
+  EXPECT_EQ(fx_sphericity(src.data(), dst.data(), 8, 6, 4, 3, 3, -100, 0, 7, 0, 5, 0),
+            PHOTOFX_SUCCESS);
 }
 
-TEST(Sphericity, OnlyTheWindowIsWarpedAndItIsClippedToTheImage) {
+// Only the window is warped, clipped to the image; an empty window warps nothing. Fast mode fills
+// 2 x 2 blocks from their top-left pixel, counted from the window's corner, and never writes past
+// an odd-sized window or the image's last row and column.
+TEST(Sphericity, WindowAndFastModeStayInsideTheWindowClippedToTheImage) {
   const int32_t w = 20, h = 16;
-  const Pixels src = pfx::test::random_image(w, h, 9);
+  const Pixels src = translucent_image(w, h, 9);
   const Warped full = sphericity(src, w, h, 10, 8, 20, 70);
-  const Warped part = sphericity(src, w, h, 10, 8, 20, 70, 4, 12, 3, 9);
+  const pfx::Rect win{4, 12, 3, 9};
+  const Warped part = sphericity(src, w, h, 10, 8, 20, 70, win);
+  const Warped fast = sphericity(src, w, h, 10, 8, 20, 70, win, 1);
   for (int32_t y = 0; y < h; ++y) {
     for (int32_t x = 0; x < w; ++x) {
       const size_t i = static_cast<size_t>(y * w + x);
       const bool in = x >= 4 && x <= 12 && y >= 3 && y <= 9;
-      EXPECT_EQ(part.px[i], in ? full.px[i] : src[i]) << x << "," << y;
+      ASSERT_EQ(part.px[i], in ? full.px[i] : src[i]) << x << "," << y;
+      const int32_t ax = x - (x - 4) % 2, ay = y - (y - 3) % 2;
+      ASSERT_EQ(fast.px[i], in ? full.px[static_cast<size_t>(ay * w + ax)] : src[i])
+          << x << "," << y;
     }
   }
-  const Warped huge = sphericity(src, w, h, 10, 8, 20, 70, INT32_MIN, INT32_MAX, -5, 1000);
-  EXPECT_EQ(huge.px, full.px);
-  const Warped empty = sphericity(src, w, h, 10, 8, 20, 70, 5, 4, 0, h - 1);
-  EXPECT_EQ(empty.px, src);
-}
-
-TEST(Sphericity, FastModeFillsBlocksWithTheValueOfTheirTopLeftPixel) {
-  const int32_t w = 24, h = 20;
-  const Pixels src = pfx::test::random_image(w, h, 10);
-  // A circle that covers the window, so every block is computed.
-  for (int32_t level : {-80, 60}) {
-    const Warped normal = sphericity(src, w, h, 12, 10, 30, level, 2, 17, 3, 14);
-    const Warped fast = sphericity(src, w, h, 12, 10, 30, level, 2, 17, 3, 14, 1);
-    for (int32_t y = 3; y <= 14; ++y) {
-      for (int32_t x = 2; x <= 17; ++x) {
-        const int32_t ax = x - (x - 2) % 2, ay = y - (y - 3) % 2;
-        EXPECT_EQ(fast.px[static_cast<size_t>(y * w + x)],
-                  normal.px[static_cast<size_t>(ay * w + ax)])
-            << x << "," << y;
-      }
-    }
-  }
-}
-
-TEST(Sphericity, FastModeNeverWritesPastTheWindow) {
-  const int32_t w = 9, h = 7;
-  const Pixels src = translucent_image(w, h, 11);
-  // Odd window sizes, and a window ending at the image's last row and column.
-  const Warped r = sphericity(src, w, h, 4, 3, 30, 90, 1, 5, 0, 2, 1);
-  for (int32_t y = 0; y < h; ++y) {
-    for (int32_t x = 0; x < w; ++x) {
-      if (x < 1 || x > 5 || y > 2) {
-        EXPECT_EQ(r.px[y * w + x], src[y * w + x]) << x << "," << y;
-      }
-    }
-  }
-  EXPECT_EQ(r.px[2 * w + 5] >> 24, 0xFFu);
-  const Warped edge = sphericity(src, w, h, 4, 3, 30, 90, 1);
+  EXPECT_EQ(sphericity(src, w, h, 10, 8, 20, 70, {INT32_MIN, INT32_MAX, -5, 1000}).px, full.px);
+  EXPECT_EQ(sphericity(src, w, h, 10, 8, 20, 70, {5, 4, 0, h - 1}).px, src);
+  const Warped edge = sphericity(translucent_image(9, 7, 11), 9, 7, 4, 3, 30, 90, {0, 8, 0, 6}, 1);
   EXPECT_EQ(edge.code, PHOTOFX_SUCCESS);
-  EXPECT_EQ(edge.px[h * w - 1] >> 24, 0xFFu);
+  EXPECT_EQ(edge.px[9 * 7 - 1] >> 24, 0xFFu);
 }
 
 // One row whose pixels name their distance from column c: red counts blocks of 256 columns,
@@ -202,17 +139,14 @@ TEST(Sphericity, FarFromTheOriginTheWarpMovesWithItsCentre) {
   const int32_t h = 5, big_w = 12000, small_w = 2000, shift = 10000;
   const Pixels big = pfx::test::random_image(big_w, h, 12);
   Pixels small(static_cast<size_t>(small_w) * h);
-  for (int32_t y = 0; y < h; ++y) {
-    for (int32_t x = 0; x < small_w; ++x) small[y * small_w + x] = big[y * big_w + x + shift];
-  }
+  for (size_t i = 0; i < small.size(); ++i)
+    small[i] = big[i / small_w * big_w + i % small_w + shift];
   for (int32_t level : {-100, -41, 0, 57, 100}) {
-    const Warped far = sphericity(big, big_w, h, 11000, 2, 300, level, 10500, 11500, 0, h - 1);
+    const Warped far = sphericity(big, big_w, h, 11000, 2, 300, level, {10500, 11500, 0, h - 1});
     const Warped near = sphericity(small, small_w, h, 1000, 2, 300, level);
     ASSERT_EQ(far.code, PHOTOFX_SUCCESS);
-    for (int32_t y = 0; y < h; ++y) {
-      for (int32_t x = 0; x < small_w; ++x) {
-        ASSERT_EQ(far.px[y * big_w + x + shift], near.px[y * small_w + x]) << level << " " << x;
-      }
+    for (size_t i = 0; i < small.size(); ++i) {
+      ASSERT_EQ(far.px[i / small_w * big_w + i % small_w + shift], near.px[i]) << level << " " << i;
     }
   }
 }

@@ -1,12 +1,13 @@
 // Twirl: the square-root and sine tables against <cmath>, the fixed points of the warp (angle 0,
-// the centre, the rim), the direction of the turn, the argument checks, fast mode, and radii
-// whose distances need more than 31 bits.
+// the centre, the rim), the direction of the turn, the argument checks, fast mode's window, and
+// radii whose distances need more than 31 bits.
 #include <gtest/gtest.h>
 
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
 
+#include "frame/frame.h"
 #include "photofx.h"
 #include "support/images.h"
 
@@ -14,26 +15,21 @@ namespace {
 
 using pfx::test::Pixels;
 
-constexpr uint32_t kOpaque = 0xFF000000u;
-
-// Random colours with alpha 0x40, so that the opaque alpha of a warped pixel marks it.
-Pixels translucent_image(int32_t w, int32_t h, uint64_t seed) {
-  Pixels px = pfx::test::random_image(w, h, seed);
-  for (uint32_t& p : px) p = (p & 0xFFFFFFu) | 0x40000000u;
-  return px;
-}
-
 TEST(TwirlTables, SquareRootStepsAreTheRoundedRootsOfTheirLowerEnds) {
-  const auto check = [](const int32_t* table, int32_t n, int32_t step, int32_t first_u) {
-    for (int32_t j = 0; j < n; ++j) {
-      const double u = static_cast<double>(step) * j + first_u;
-      ASSERT_EQ(table[j], static_cast<int32_t>(std::llround(256.0 * std::sqrt(u)))) << j;
+  const struct {
+    const int32_t* table;
+    int32_t n, step, first;
+  } tables[] = {{SQRT_STEP_1, 128, 1, 0},
+                {SQRT_STEP_2, 480, 4, 128},
+                {SQRT_STEP_3, 768, 8, 2048},
+                {SQRT_STEP_4, 65536, 64, 0}};
+  for (const auto& t : tables) {
+    for (int32_t j = 0; j < t.n; ++j) {
+      const double u = static_cast<double>(t.step) * j + t.first;
+      ASSERT_EQ(t.table[j], static_cast<int32_t>(std::llround(256.0 * std::sqrt(u))))
+          << t.step << " " << j;
     }
-  };
-  check(SQRT_STEP_1, 128, 1, 0);
-  check(SQRT_STEP_2, 480, 4, 128);
-  check(SQRT_STEP_3, 768, 8, 2048);
-  check(SQRT_STEP_4, 65536, 64, 0);
+  }
 }
 
 TEST(TwirlTables, SineIsTheRoundedQuarterWave) {
@@ -51,42 +47,32 @@ struct Warped {
 };
 
 Warped twirl(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
-             int32_t angle, int32_t left, int32_t right, int32_t top, int32_t bottom,
-             uint32_t fast = 0) {
+             int32_t angle, pfx::Rect win = {0, -1, 0, -1}, uint32_t fast = 0) {
+  if (win.right < 0) win = {0, w - 1, 0, h - 1};
   Warped r{0, Pixels(src.size(), 0xDEADBEEFu)};
-  r.code = fx_twirl(src.data(), r.px.data(), w, h, cx, cy, radius, angle, left, right, top, bottom,
-                    fast);
+  r.code = fx_twirl(src.data(), r.px.data(), w, h, cx, cy, radius, angle, win.left, win.right,
+                    win.top, win.bottom, fast);
   return r;
 }
 
-Warped twirl(const Pixels& src, int32_t w, int32_t h, int32_t cx, int32_t cy, int32_t radius,
-             int32_t angle, uint32_t fast = 0) {
-  return twirl(src, w, h, cx, cy, radius, angle, 0, w - 1, 0, h - 1, fast);
-}
-
-TEST(Twirl, AngleZeroCopiesTheImageExactly) {
-  const Pixels src = pfx::test::random_image(17, 13, 20);
-  const Warped r = twirl(src, 17, 13, 8, 6, 40, 0);
-  EXPECT_EQ(r.code, PHOTOFX_SUCCESS);
-  EXPECT_EQ(r.px, src);
-}
-
-TEST(Twirl, CentreMapsToItselfAndOnlyPixelsStrictlyInsideAreWarped) {
-  const Pixels src = translucent_image(21, 21, 21);
+// Angle 0 copies the image exactly. Otherwise the centre samples itself, and only pixels strictly
+// inside the rim are warped (made opaque, which the source's alpha 0x40 tells apart).
+TEST(Twirl, AngleZeroTheCentreAndTheRimKeepTheirPixels) {
+  const Pixels random = pfx::test::random_image(17, 13, 20);
+  EXPECT_EQ(twirl(random, 17, 13, 8, 6, 40, 0).px, random);
+  Pixels src = pfx::test::random_image(21, 21, 21);
+  for (uint32_t& p : src) p = (p & 0xFFFFFFu) | 0x40000000u;
   for (int32_t angle : {-360, -90, 1, 45, 200, 360}) {
     const Warped r = twirl(src, 21, 21, 10, 10, 5, angle);
     ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
-    EXPECT_EQ(r.px[10 * 21 + 10], src[10 * 21 + 10] | kOpaque) << angle;
-    for (int32_t y = 0; y < 21; ++y) {
-      for (int32_t x = 0; x < 21; ++x) {
-        const size_t i = static_cast<size_t>(y * 21 + x);
-        const int32_t d2 = (x - 10) * (x - 10) + (y - 10) * (y - 10);
-        // d2 = 25 (for example 3^2 + 4^2) lies on the rim and keeps its pixel.
-        if (d2 >= 25) {
-          EXPECT_EQ(r.px[i], src[i]) << x << "," << y;
-        } else {
-          EXPECT_EQ(r.px[i] >> 24, 0xFFu) << x << "," << y;
-        }
+    EXPECT_EQ(r.px[10 * 21 + 10], src[10 * 21 + 10] | 0xFF000000u) << angle;
+    for (size_t i = 0; i < src.size(); ++i) {
+      const int32_t x = int32_t(i % 21), y = int32_t(i / 21);
+      // d2 = 25 (for example 3^2 + 4^2) lies on the rim and keeps its pixel.
+      if ((x - 10) * (x - 10) + (y - 10) * (y - 10) >= 25) {
+        ASSERT_EQ(r.px[i], src[i]) << x << "," << y;
+      } else {
+        ASSERT_EQ(r.px[i] >> 24, 0xFFu) << x << "," << y;
       }
     }
   }
@@ -96,62 +82,67 @@ TEST(Twirl, PositiveAnglesTurnFromDownTowardRight) {
   // Left half blue, right half red, the centre column green. Near the centre the twist is
   // almost the full angle, so the pixel two below the centre samples two to the right of it
   // for +90 and two to the left for -90.
-  const int32_t w = 41, h = 41, c = 20;
-  Pixels src(static_cast<size_t>(w * h));
-  for (int32_t y = 0; y < h; ++y) {
-    for (int32_t x = 0; x < w; ++x) {
-      src[y * w + x] = x < c ? 0xFF0000FFu : (x > c ? 0xFFFF0000u : 0xFF00FF00u);
-    }
+  const int32_t w = 41, c = 20;
+  Pixels src(static_cast<size_t>(w * w));
+  for (size_t i = 0; i < src.size(); ++i) {
+    const int32_t x = int32_t(i % w);
+    src[i] = x < c ? 0xFF0000FFu : (x > c ? 0xFFFF0000u : 0xFF00FF00u);
   }
-  EXPECT_EQ(twirl(src, w, h, c, c, 20, 90).px[(c + 2) * w + c], 0xFFFF0000u);
-  EXPECT_EQ(twirl(src, w, h, c, c, 20, -90).px[(c + 2) * w + c], 0xFF0000FFu);
+  EXPECT_EQ(twirl(src, w, w, c, c, 20, 90).px[(c + 2) * w + c], 0xFFFF0000u);
+  EXPECT_EQ(twirl(src, w, w, c, c, 20, -90).px[(c + 2) * w + c], 0xFF0000FFu);
 }
 
+// Angles beyond a turn, radius 0, centres outside the image, missing buffers and one buffer as
+// source and destination (the warp would read pixels it had already moved) are refused.
 TEST(Twirl, BadArgumentsWriteNothing) {
-  const Pixels src = pfx::test::random_image(8, 6, 22);
-  Pixels dst(src.size(), 0xDEADBEEFu);
-  const Pixels before = dst;
-  const auto call = [&](const uint32_t* s, uint32_t* d, int32_t cx, int32_t cy, int32_t radius,
-                        int32_t angle) {
-    return fx_twirl(s, d, 8, 6, cx, cy, radius, angle, 0, 7, 0, 5, 0);
+  Pixels src = pfx::test::random_image(8, 6, 22);
+  const Pixels original = src, untouched(src.size(), 0xDEADBEEFu);
+  Pixels dst = untouched;
+  const struct {
+    const uint32_t* s;
+    uint32_t* d;
+    int32_t cx, cy, radius, angle;
+  } cases[] = {
+      // clang-format off
+      {src.data(), dst.data(), 4, 3, 3, 361},  {src.data(), dst.data(), 4, 3, 3, -361},
+      {src.data(), dst.data(), 4, 3, 0, 90},   {src.data(), dst.data(), 8, 3, 3, 90},
+      {src.data(), dst.data(), 4, -1, 3, 90},  {src.data(), dst.data(), 4, 6, 3, 90},
+      {nullptr, dst.data(), 4, 3, 3, 90},      {src.data(), nullptr, 4, 3, 3, 90},
+      {src.data(), src.data(), 4, 3, 3, 90},
+      // clang-format on
   };
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, 361), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 3, -361), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 0, 90), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 8, 3, 3, 90), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, -1, 3, 90), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 6, 3, 90), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(nullptr, dst.data(), 4, 3, 3, 90), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(call(src.data(), nullptr, 4, 3, 3, 90), PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(dst, before);
+  for (const auto& c : cases) {
+    EXPECT_EQ(fx_twirl(c.s, c.d, 8, 6, c.cx, c.cy, c.radius, c.angle, 0, 7, 0, 5, 0),
+              PHOTOFX_INVALID_ARGUMENT)
+        << &c - cases;
+  }
   runTwirl(src.data(), dst.data(), 8, 6, 4, 3, 0, 90, 0, 7, 0, 5, 0);
-  EXPECT_EQ(dst, before);
-  Pixels same = src;
-  EXPECT_EQ(fx_twirl(same.data(), same.data(), 8, 6, 4, 3, 3, 90, 0, 7, 0, 5, 0),
-            PHOTOFX_INVALID_ARGUMENT);
-  EXPECT_EQ(same, src);
-  EXPECT_EQ(call(src.data(), dst.data(), 4, 3, 1, 360), PHOTOFX_SUCCESS);
+  EXPECT_EQ(dst, untouched);
+  EXPECT_EQ(src, original);
+  EXPECT_EQ(fx_twirl(src.data(), dst.data(), 8, 6, 4, 3, 1, 360, 0, 7, 0, 5, 0), PHOTOFX_SUCCESS);
 }
 
+// Fast mode fills 2 x 2 blocks from their top-left pixel, counted from the window's corner, and
+// writes nothing outside the window, even one reaching past every edge of an odd-sized image.
 TEST(Twirl, FastModeFillsBlocksInsideTheClippedWindowOnly) {
   const int32_t w = 24, h = 21;
-  const Pixels src = translucent_image(w, h, 23);
-  // The circle covers the window, so every block is computed from its top-left pixel.
-  const Warped normal = twirl(src, w, h, 12, 10, 40, 150, 3, 18, 2, 14);
-  const Warped fast = twirl(src, w, h, 12, 10, 40, 150, 3, 18, 2, 14, 1);
+  Pixels src = pfx::test::random_image(w, h, 23);
+  for (uint32_t& p : src) p = (p & 0xFFFFFFu) | 0x40000000u;
+  const pfx::Rect win{3, 18, 2, 14};
+  const Warped normal = twirl(src, w, h, 12, 10, 40, 150, win);
+  const Warped fast = twirl(src, w, h, 12, 10, 40, 150, win, 1);
   for (int32_t y = 0; y < h; ++y) {
     for (int32_t x = 0; x < w; ++x) {
       const size_t i = static_cast<size_t>(y * w + x);
       if (x < 3 || x > 18 || y < 2 || y > 14) {
-        EXPECT_EQ(fast.px[i], src[i]) << x << "," << y;
-        continue;
+        ASSERT_EQ(fast.px[i], src[i]) << x << "," << y;
+      } else {
+        const int32_t ax = x - (x - 3) % 2, ay = y - (y - 2) % 2;
+        ASSERT_EQ(fast.px[i], normal.px[static_cast<size_t>(ay * w + ax)]) << x << "," << y;
       }
-      const int32_t ax = x - (x - 3) % 2, ay = y - (y - 2) % 2;
-      EXPECT_EQ(fast.px[i], normal.px[static_cast<size_t>(ay * w + ax)]) << x << "," << y;
     }
   }
-  // A window past every edge of an odd-sized image stays inside it.
-  const Warped wide = twirl(src, w, h, 12, 10, 40, 150, -7, 1000, -3, 500, 1);
+  const Warped wide = twirl(src, w, h, 12, 10, 40, 150, {-7, 1000, -3, 500}, 1);
   EXPECT_EQ(wide.code, PHOTOFX_SUCCESS);
   EXPECT_EQ(wide.px[static_cast<size_t>(h * w - 1)] >> 24, 0xFFu);
 }
@@ -178,8 +169,7 @@ TEST(Twirl, LargeRadiiKeepEachPixelAtItsDistanceNearTheRim) {
   // distance's bytes adds at most half a pixel.
   for (int32_t radius : {5000, 40000}) {
     const int32_t c = radius, w = 2 * radius + 1;
-    const Pixels src = distance_code(w, c);
-    const Warped r = twirl(src, w, 1, c, 0, radius, 90);
+    const Warped r = twirl(distance_code(w, c), w, 1, c, 0, radius, 90);
     ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
     for (int32_t x = 0; x < w; ++x) {
       const int32_t d = std::abs(x - c);
