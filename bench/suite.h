@@ -74,19 +74,19 @@ enum class Base : uint8_t { kNone, kMemcpy, kPeer };
 
 struct Goal {
   Base base = Base::kNone;
-  double factor = 0;        // the call takes at most factor x the base's time
-  double max_scratch = 0;   // peak scratch bytes per pixel; 0: no memory goal
+  double factor = 0;       // the call takes at most factor x the base's time
+  double max_scratch = 0;  // peak scratch bytes per pixel; 0: no memory goal
 };
 
 // The goals of the performance issue, by kind of effect.
 constexpr Goal kNoGoal{};
-constexpr Goal kPointGoal{Base::kMemcpy, 2.0};              // point operations
-constexpr Goal kHsvGoal{Base::kPeer, 1.0};                  // HSV-based effects vs HSV round trip
-constexpr Goal kPresetGoal{Base::kMemcpy, 3.0};             // preset chains other than downlight
+constexpr Goal kPointGoal{Base::kMemcpy, 2.0};        // point operations
+constexpr Goal kHsvGoal{Base::kPeer, 1.0};            // HSV-based effects vs HSV round trip
+constexpr Goal kPresetGoal{Base::kMemcpy, 3.0};       // preset chains other than downlight
 constexpr Goal kBlurPreviewGoal{Base::kMemcpy, 4.0};  // the whole preview call on 12 MP
-constexpr Goal kBlurKernelGoal{Base::kPeer, 1.5};           // the Gaussian of the working image
-constexpr Goal kWarpGoal{Base::kPeer, 1.5};                 // twirl and sphericity vs remap
-constexpr Goal kAutoGoal{Base::kMemcpy, 4.0, 8.0};   // auto adjust, time and scratch
+constexpr Goal kBlurKernelGoal{Base::kPeer, 1.5};     // the Gaussian of the working image
+constexpr Goal kWarpGoal{Base::kPeer, 1.5};           // twirl and sphericity vs remap
+constexpr Goal kAutoGoal{Base::kMemcpy, 4.0, 8.0};    // auto adjust, time and scratch
 
 // One effect. `full` runs on the frame with empty bounds, `partial` (when the library has a
 // masked variant) on the frame with the ellipse's bounds; each becomes a benchmark per size.
