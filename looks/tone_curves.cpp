@@ -46,6 +46,15 @@ constexpr bool levels_in_byte_range(int32_t low, int32_t high) {
   return low >= 0 && low < high && high <= 255;
 }
 
+// The full-variant frame for the table form.
+void map_image(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+               const ChannelMap& map) {
+  if (src == nullptr || dst == nullptr) return;
+  const int64_t n = pixel_count(width, height);
+  if (n > kMaxPixels) return;
+  map_channels(map, src, dst, static_cast<size_t>(n));
+}
+
 // n / 255 to the power 1 / gamma, scaled back to 0..255 and rounded half up. The clamp is made in
 // double before the conversion, so a gamma of zero, a negative gamma or a NaN (whose products
 // may be infinite or NaN) still gives a byte: NaN reads as 0.
@@ -66,9 +75,8 @@ void control_gamma(const uint32_t* src, uint32_t* dst, int32_t width, int32_t he
   if (src == nullptr || dst == nullptr) return;
   int32_t curve[256];
   for (int32_t n = 0; n < 256; ++n) curve[n] = pfx::gamma_entry(n, gamma);
-  pfx::for_each_pixel_by_table(
-      src, dst, width, height,
-      pfx::selected_channels(channel, [&](int32_t c) { return curve[c]; }));
+  pfx::map_image(src, dst, width, height,
+                 pfx::selected_channels(channel, [&](int32_t c) { return curve[c]; }));
 }
 
 // The level arithmetic is done in 64 bits: for 0 <= low < high <= 255 it gives the same values
@@ -85,11 +93,10 @@ void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, i
                         }));
     return;
   }
-  pfx::for_each_pixel_by_table(src, dst, width, height,
-                               pfx::selected_channels(channel, [&](int32_t c) {
-                                 const int64_t v = (scale * (c - int64_t{low})) >> 10;
-                                 return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                               }));
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
+                   const int64_t v = (scale * (c - int64_t{low})) >> 10;
+                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
+                 }));
 }
 
 void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
@@ -104,11 +111,10 @@ void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, 
                         }));
     return;
   }
-  pfx::for_each_pixel_by_table(src, dst, width, height,
-                               pfx::selected_channels(channel, [&](int32_t c) {
-                                 const int64_t v = ((scale * c) >> 10) + low;
-                                 return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                               }));
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
+                   const int64_t v = ((scale * c) >> 10) + low;
+                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
+                 }));
 }
 
 }  // extern "C"
