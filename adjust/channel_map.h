@@ -3,6 +3,7 @@
 // Exact by construction, since the table holds the rule's own results.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 
 #include "frame/pixel.h"
@@ -31,5 +32,10 @@ struct ChannelMap {
     return alpha_bits(p) | red[(p >> 16) & 0xFFu] | green[(p >> 8) & 0xFFu] | blue[p & 0xFFu];
   }
 };
+
+// dst[i] = map(src[i]) for i < n; src and dst may be the same buffer. On x86-64 CPUs with byte
+// permutes (AVX-512 VBMI) sixteen pixels are looked up at once, the three tables held in
+// registers; elsewhere, and for the last few pixels, one pixel at a time.
+void map_channels(const ChannelMap& map, const uint32_t* src, uint32_t* dst, size_t n);
 
 }  // namespace pfx

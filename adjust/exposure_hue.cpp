@@ -7,7 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "adjust/channel_map.h"
+#include "adjust/exposure_hue.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
 #include "frame/pixel.h"
@@ -18,38 +18,19 @@ namespace {
 
 constexpr int32_t status(bool done) { return done ? PHOTOFX_SUCCESS : PHOTOFX_INVALID_ARGUMENT; }
 
-// Nearest integer of a 16.16 value, halves upward, for products that need more than 32 bits.
-constexpr int64_t fixtoi64(int64_t x) { return (x >> 16) + ((x >> 15) & 1); }
-
-// The factor itofix(10 * level) / 100, truncated toward zero, and each channel times it. Both are
-// formed in 64 bits: from level 1286 up the 32-bit product of a bright channel and the factor
-// would overflow, and from 3277 up the factor itself. In 64 bits every level, INT32_MAX included,
-// gives the unbounded result (white for every non-zero channel from level 2555 up), and every
-// level whose 32-bit arithmetic fits gives the same value as before. The curve goes into a
-// table once per call, so the wide arithmetic costs nothing per pixel.
-ChannelMap exposure_map(int32_t level) {
-  const int64_t factor = int64_t{level} * 655360 / 100;
-  return ChannelMap([factor](int32_t c) {
-    const int64_t v = fixtoi64(c * factor);
-    return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-  });
-}
-
 // Exposure's partial variant: valid bounds only switch masked mode on; the mask is then read for
 // every pixel of the image, and a selected pixel is edited whether it lies inside the bounds or
-// not. Invalid bounds edit every pixel without reading the mask.
+// not. Invalid bounds edit every pixel without reading the mask. As in the common frame, the
+// copy of the source and the edit are one pass.
 template <class Rule>
 bool edit_mask_over_whole_image(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                 int32_t width, int32_t height, Rect bounds, const Rule& rule) {
   if (!partial_args_ok(src, mask, dst, width, height, bounds)) return false;
-  const int64_t n = pixel_count(width, height);
-  copy_image(src, dst, n);
+  const size_t n = static_cast<size_t>(pixel_count(width, height));
   if (is_region(bounds)) {
-    for (size_t i = 0; i < static_cast<size_t>(n); ++i) {
-      if (mask[i] == 1) dst[i] = rule(src[i]);
-    }
+    map_selected_pixels(src, mask, dst, n, rule);
   } else {
-    for (size_t i = 0; i < static_cast<size_t>(n); ++i) dst[i] = rule(src[i]);
+    map_pixels(src, dst, n, rule);
   }
   return true;
 }
@@ -59,18 +40,27 @@ bool edit_mask_over_whole_image(const uint32_t* src, const uint8_t* mask, uint32
 // black (greys keep their value when the hue is not negative). From 41 steps on either side of 10
 // that is already the case for every hue, so holding the steps at +-100 changes no result and
 // keeps the shift from overflowing.
-auto hue_rule(int32_t level) {
-  const int32_t shift = 18 * (clamp_to(level, -90, 110) - 10);
-  return [shift](uint32_t p) {
-    if (shift == 0) return p;
-    const Hsv hsv = rgb_to_hsv(red_of(p), green_of(p), blue_of(p));
-    int32_t h = hsv.h + shift;
-    if (h < 0) h += 360;
-    if (h > 359) h -= 360;
-    const Rgb c = hsv_to_rgb(h, hsv.s, hsv.v);
-    return pack(p, c.r, c.g, c.b);
-  };
-}
+class HueTurn {
+ public:
+  explicit HueTurn(int32_t level) : shift_(18 * (clamp_to(level, -90, 110) - 10)) {}
+
+  // Level 10 repacks every pixel unchanged: the callers then skip the conversion altogether,
+  // which also keeps this test out of the pixel loop.
+  bool turns() const { return shift_ != 0; }
+
+  Rgb operator()(Rgb c) const {
+    const Hsv hsv = rgb_to_hsv(c.r, c.g, c.b);
+    int32_t h = hsv.h + shift_;
+    h += h < 0 ? 360 : 0;
+    h -= h > 359 ? 360 : 0;
+    return hsv_to_rgb(h, hsv.s, hsv.v);
+  }
+
+ private:
+  int32_t shift_;
+};
+
+constexpr auto unchanged = [](uint32_t p) { return p; };
 
 }  // namespace
 }  // namespace pfx
@@ -80,27 +70,37 @@ extern "C" {
 int32_t fx_control_exposure_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                 int32_t level) {
   if (src == nullptr || dst == nullptr) return PHOTOFX_INVALID_ARGUMENT;
-  return pfx::status(pfx::for_each_pixel(src, dst, width, height, pfx::exposure_map(level)));
+  return pfx::status(
+      pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Exposure(level))));
 }
 
 int32_t fx_control_exposure(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                             int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                             int32_t bottom) {
   if (src == nullptr || dst == nullptr) return PHOTOFX_INVALID_ARGUMENT;
-  return pfx::status(pfx::edit_mask_over_whole_image(
-      src, mask, dst, width, height, {left, right, top, bottom}, pfx::exposure_map(level)));
+  return pfx::status(pfx::edit_mask_over_whole_image(src, mask, dst, width, height,
+                                                     {left, right, top, bottom},
+                                                     pfx::on_pixels(pfx::Exposure(level))));
 }
 
 int32_t fx_control_hue_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                            int32_t level) {
-  return pfx::status(pfx::for_each_pixel(src, dst, width, height, pfx::hue_rule(level)));
+  const pfx::HueTurn turn(level);
+  if (!turn.turns())
+    return pfx::status(pfx::for_each_pixel(src, dst, width, height, pfx::unchanged));
+  return pfx::status(pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(turn)));
 }
 
 int32_t fx_control_hue(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                        int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                        int32_t bottom) {
-  return pfx::status(pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                                        pfx::hue_rule(level)));
+  const pfx::HueTurn turn(level);
+  const pfx::Rect bounds{left, right, top, bottom};
+  if (!turn.turns()) {
+    return pfx::status(pfx::edit_selected(src, mask, dst, width, height, bounds, pfx::unchanged));
+  }
+  return pfx::status(
+      pfx::edit_selected(src, mask, dst, width, height, bounds, pfx::on_pixels(turn)));
 }
 
 void controlExposure(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,

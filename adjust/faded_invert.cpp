@@ -7,7 +7,7 @@
 // faded colour a level outside 0..100, with PHOTOFX_INVALID_ARGUMENT and nothing written.
 #include <cstdint>
 
-#include "adjust/channel_map.h"
+#include "adjust/faded_invert.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "photofx.h"
@@ -19,30 +19,7 @@ constexpr int32_t status(bool done) { return done ? PHOTOFX_SUCCESS : PHOTOFX_IN
 
 constexpr bool fade_level_ok(int32_t level) { return level >= 0 && level <= 100; }
 
-// The faded target of one channel is (k * c + o) / 255.
-struct FadeLine {
-  int32_t k, o;
-};
-
-constexpr FadeLine kFadeRed{141, 26520};
-constexpr FadeLine kFadeGreen{188, 13260};
-constexpr FadeLine kFadeBlue{107, 18360};
-
-// The blend (1 - L/100) * c + (L/100) * target with a single truncating division, so only the
-// final value is rounded. With L in 0..100 every term is non-negative and the sum stays below
-// 6.6 million; the result never exceeds 255, the limit is only a guard.
-constexpr int32_t fade_channel(int32_t c, FadeLine line, int32_t level) {
-  const int32_t v = (255 * c * (100 - level) + (line.k * c + line.o) * level) / 25500;
-  return v > 255 ? 255 : v;
-}
-
-ChannelMap fade_map(int32_t level) {
-  return ChannelMap([level](int32_t c) { return fade_channel(c, kFadeRed, level); },
-                    [level](int32_t c) { return fade_channel(c, kFadeGreen, level); },
-                    [level](int32_t c) { return fade_channel(c, kFadeBlue, level); });
-}
-
-constexpr uint32_t invert(uint32_t p) { return p ^ 0x00FFFFFFu; }
+constexpr auto invert = [](uint32_t p) { return p ^ 0x00FFFFFFu; };
 
 }  // namespace
 }  // namespace pfx
@@ -54,7 +31,8 @@ int32_t fx_control_fadedcolor_all(const uint32_t* src, uint32_t* dst, int32_t wi
   if (src == nullptr || dst == nullptr || !pfx::fade_level_ok(level)) {
     return PHOTOFX_INVALID_ARGUMENT;
   }
-  return pfx::status(pfx::for_each_pixel(src, dst, width, height, pfx::fade_map(level)));
+  return pfx::status(
+      pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Fade(level))));
 }
 
 int32_t fx_control_fadedcolor(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
@@ -64,7 +42,7 @@ int32_t fx_control_fadedcolor(const uint32_t* src, const uint8_t* mask, uint32_t
     return PHOTOFX_INVALID_ARGUMENT;
   }
   return pfx::status(pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                                        pfx::fade_map(level)));
+                                        pfx::on_pixels(pfx::Fade(level))));
 }
 
 int32_t fx_apply_invert_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {

@@ -8,7 +8,7 @@
 // 0..360 with PHOTOFX_INVALID_ARGUMENT and then writes nothing.
 #include <cstdint>
 
-#include "adjust/channel_map.h"
+#include "adjust/gains_colortone.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
 #include "frame/pixel.h"
@@ -16,23 +16,6 @@
 
 namespace pfx {
 namespace {
-
-// Each channel moves by a fixed offset that depends only on the three levels. The offsets are
-// formed in 64 bits (levels may be anything) and held to +-255: an offset of 255 or more already
-// makes every channel 255 and one of -255 or less every channel 0, so the hold changes no result.
-int32_t gain_offset(int64_t own, int64_t other1, int64_t other2) {
-  const int64_t v = 6 * (own - 10) - 3 * (other1 - 10) - 3 * (other2 - 10);
-  return static_cast<int32_t>(v < -255 ? -255 : (v > 255 ? 255 : v));
-}
-
-ChannelMap gains_map(int32_t red, int32_t green, int32_t blue) {
-  const int32_t dr = gain_offset(red, green, blue);
-  const int32_t dg = gain_offset(green, red, blue);
-  const int32_t db = gain_offset(blue, red, green);
-  return ChannelMap([dr](int32_t c) { return clamp_byte(c + dr); },
-                    [dg](int32_t c) { return clamp_byte(c + dg); },
-                    [db](int32_t c) { return clamp_byte(c + db); });
-}
 
 // Saturation 0.3 in 16.16, truncated.
 constexpr int32_t kToneSaturation = 19660;
@@ -72,20 +55,20 @@ extern "C" {
 
 void fx_adjust_RGB_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                        int32_t red, int32_t green, int32_t blue) {
-  pfx::for_each_pixel(src, dst, width, height, pfx::gains_map(red, green, blue));
+  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Gains(red, green, blue)));
 }
 
 void fx_adjust_RGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                    int32_t height, int32_t red, int32_t green, int32_t blue, int32_t left,
                    int32_t right, int32_t top, int32_t bottom) {
   pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                     pfx::gains_map(red, green, blue));
+                     pfx::on_pixels(pfx::Gains(red, green, blue)));
 }
 
 int32_t fx_change_colortone(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                             int32_t hue) {
   if (src == nullptr || dst == nullptr || hue < 0 || hue > 360) return PHOTOFX_INVALID_ARGUMENT;
-  const bool done = pfx::for_each_pixel(src, dst, width, height, pfx::ToneMap(hue));
+  const bool done = pfx::for_each_pixel_by_table(src, dst, width, height, pfx::ToneMap(hue));
   return done ? PHOTOFX_SUCCESS : PHOTOFX_INVALID_ARGUMENT;
 }
 

@@ -18,10 +18,17 @@ constexpr YCbCr to_ycbcr(int32_t r, int32_t g, int32_t b) {
           (128 * r - 107 * g - 21 * b) >> 8};
 }
 
-// Back to a pixel with the alpha of `p`, each channel clamped to 0..255.
+constexpr YCbCr to_ycbcr(Rgb c) { return to_ycbcr(c.r, c.g, c.b); }
+
+// Back to colour, each channel clamped to 0..255.
+constexpr Rgb to_rgb(int32_t y, int32_t cb, int32_t cr) {
+  return {clamp_byte(y + ((359 * cr) >> 8)), clamp_byte(y - ((88 * cb + 183 * cr) >> 8)),
+          clamp_byte(y + ((454 * cb) >> 8))};
+}
+
+// Back to a pixel with the alpha of `p`.
 constexpr uint32_t from_ycbcr(uint32_t p, int32_t y, int32_t cb, int32_t cr) {
-  return pack(p, clamp_byte(y + ((359 * cr) >> 8)), clamp_byte(y - ((88 * cb + 183 * cr) >> 8)),
-              clamp_byte(y + ((454 * cb) >> 8)));
+  return pack(p, to_rgb(y, cb, cr));
 }
 
 }  // namespace pfx

@@ -19,6 +19,27 @@ constexpr uint32_t pack(uint32_t p, int32_t r, int32_t g, int32_t b) {
          ((static_cast<uint32_t>(g) & 0xFFu) << 8) | (static_cast<uint32_t>(b) & 0xFFu);
 }
 
+// The three colour channels of a pixel as the per-pixel rules pass them along. A chain of rules
+// hands each result straight to the next rule and packs only the last one into a pixel; every
+// rule's channels lie in 0..255, so nothing is lost by not packing in between.
+struct Rgb {
+  int32_t r, g, b;
+};
+
+constexpr Rgb channels_of(uint32_t p) { return {red_of(p), green_of(p), blue_of(p)}; }
+
+constexpr uint32_t pack(uint32_t p, Rgb c) { return pack(p, c.r, c.g, c.b); }
+
+// Rules on channels, in order, as one rule on pixels that keeps each pixel's alpha.
+template <class... Rules>
+constexpr auto on_pixels(Rules... rules) {
+  return [=](uint32_t p) {
+    Rgb c = channels_of(p);
+    ((c = rules(c)), ...);
+    return pack(p, c);
+  };
+}
+
 constexpr int32_t clamp_byte(int32_t v) { return v < 0 ? 0 : (v > 255 ? 255 : v); }
 
 constexpr int32_t clamp_to(int32_t v, int32_t lo, int32_t hi) {

@@ -16,58 +16,60 @@
 namespace pfx {
 namespace {
 
-// Red offset: rises by one every four values to 32 at 127..128 and falls back to 0. Three values
-// sit one step off the plain quarter; they are part of the curve, and images tinted with it
-// depend on them.
-constexpr int32_t sepia_red(int32_t v) {
-  if (v < 0 || v > 255) return v;
-  int32_t offset;
-  if (v <= 128) {
-    offset = v == 43 ? 10 : (v + 1) >> 2;
-  } else if (v == 133) {
-    offset = 31;
-  } else if (v == 137) {
-    offset = 30;
-  } else {
-    offset = (256 - v) >> 2;
-  }
-  return v + offset;
+// Red offset for v in 0..255: rises by one every four values to 32 at 127..128 and falls back
+// to 0. Three values sit one step off the plain quarter; they are part of the curve, and images
+// tinted with it depend on them. Written as selects rather than branches so that it vectorises.
+constexpr int32_t sepia_red_offset(int32_t v) {
+  const int32_t quarter = v <= 128 ? (v + 1) >> 2 : (256 - v) >> 2;
+  return quarter - (v == 43 ? 1 : 0) + (v == 133 || v == 137 ? 1 : 0);
 }
 
-// Blue offset: a run of 0 at each end and a peak of 31 over 125..130.
-constexpr int32_t sepia_blue(int32_t v) {
-  if (v < 0 || v > 255) return v;
-  int32_t offset = 0;
-  if (v >= 1 && v <= 128) {
-    offset = (v - 1) >> 2;
-  } else if (v >= 129) {
-    offset = (254 - v) >> 2;
-    if (offset < 0) offset = 0;
-  }
-  return v - offset;
+// Blue offset for v in 0..255: a run of 0 at each end and a peak of 31 over 125..130.
+constexpr int32_t sepia_blue_offset(int32_t v) {
+  const int32_t quarter = v <= 128 ? (v - 1) >> 2 : (254 - v) >> 2;
+  return quarter < 0 ? 0 : quarter;
 }
+
+// The curves for any int: values outside 0..255 pass unchanged.
+constexpr int32_t sepia_red(int32_t v) { return v < 0 || v > 255 ? v : v + sepia_red_offset(v); }
+constexpr int32_t sepia_blue(int32_t v) { return v < 0 || v > 255 ? v : v - sepia_blue_offset(v); }
 
 constexpr uint8_t sepia_red_entry(int32_t v) { return static_cast<uint8_t>(sepia_red(v)); }
 constexpr uint8_t sepia_blue_entry(int32_t v) { return static_cast<uint8_t>(sepia_blue(v)); }
 
-// (m x gain) >> 16 for every channel mean m, clamped to a byte. The gain is formed in 64 bits,
-// so every int32_t level gives the exact product: far beyond the slider ends the grey simply
-// pins at 0 or 255.
-struct GreyscaleRule {
-  uint8_t grey[256];
+// The channel mean m times the gain, (m * gain) >> 16, held to a byte.
+//
+// The gain is formed in 64 bits, so every int32_t level gives the exact product (far beyond the
+// slider ends the grey simply pins at 0 or 255), and then held to 0 .. 255 << 16 so that the
+// product fits an unsigned 32-bit word: a gain of 0 or less makes every grey 0 and one of
+// 255 << 16 or more makes every non-zero mean 255 already. The mean is sum / 3 by a
+// multiplication, which vectorises: (sum * 683) >> 11 exceeds sum / 3 by sum / 6144, less than a
+// third for every sum up to 765, so the floor is the same.
+class GreyscaleRule {
+ public:
+  explicit constexpr GreyscaleRule(int32_t level) : gain_(held_gain(level)) {}
 
-  explicit GreyscaleRule(int32_t level) : grey{} {
+  constexpr uint32_t operator()(uint32_t p) const {
+    const uint32_t mean =
+        (static_cast<uint32_t>(red_of(p) + green_of(p) + blue_of(p)) * 683u) >> 11;
+    const uint32_t v = (mean * gain_) >> 16;
+    return alpha_bits(p) | (v > 255u ? 255u : v) * 0x010101u;
+  }
+
+ private:
+  static constexpr uint32_t held_gain(int32_t level) {
     const int64_t gain = (int64_t{level} - 10) * 4000 + 65536;
-    for (int32_t m = 0; m < 256; ++m) {
-      const int64_t v = (m * gain) >> 16;
-      grey[m] = static_cast<uint8_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-    }
+    return static_cast<uint32_t>(gain < 0 ? 0 : (gain > (255 << 16) ? (255 << 16) : gain));
   }
 
-  uint32_t operator()(uint32_t p) const {
-    const uint32_t mean = static_cast<uint32_t>(red_of(p) + green_of(p) + blue_of(p)) / 3;
-    return alpha_bits(p) | uint32_t{grey[mean]} * 0x010101u;
-  }
+  uint32_t gain_;
+};
+
+// Sepia of one pixel, arithmetic so that it vectorises: red lifted, blue lowered, green and
+// alpha kept.
+constexpr auto sepia_rule = [](uint32_t p) {
+  const int32_t r = red_of(p), b = blue_of(p);
+  return pack(p, r + sepia_red_offset(r), green_of(p), b - sepia_blue_offset(b));
 };
 
 int32_t sepia_status(bool done) { return done ? PHOTOFX_SUCCESS : PHOTOFX_INVALID_ARGUMENT; }
@@ -76,10 +78,6 @@ int32_t sepia_status(bool done) { return done ? PHOTOFX_SUCCESS : PHOTOFX_INVALI
 
 constinit const uint8_t kSepiaRed[256] = {PFX_TABLE_256(sepia_red_entry, 0)};
 constinit const uint8_t kSepiaBlue[256] = {PFX_TABLE_256(sepia_blue_entry, 0)};
-
-uint32_t sepia_pixel(uint32_t p) {
-  return pack(p, kSepiaRed[red_of(p)], green_of(p), kSepiaBlue[blue_of(p)]);
-}
 
 }  // namespace pfx
 
@@ -98,14 +96,14 @@ void fx_control_greyscale(const uint32_t* src, const uint8_t* mask, uint32_t* ds
 }
 
 int32_t fx_apply_sepia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  return pfx::sepia_status(pfx::for_each_pixel(src, dst, width, height, pfx::sepia_pixel));
+  return pfx::sepia_status(pfx::for_each_pixel(src, dst, width, height, pfx::sepia_rule));
 }
 
 int32_t fx_apply_sepia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                int32_t width, int32_t height, int32_t left, int32_t right,
                                int32_t top, int32_t bottom) {
   return pfx::sepia_status(pfx::edit_selected(src, mask, dst, width, height,
-                                              {left, right, top, bottom}, pfx::sepia_pixel));
+                                              {left, right, top, bottom}, pfx::sepia_rule));
 }
 
 int32_t fx_get_sepia_r(int32_t value) { return pfx::sepia_red(value); }

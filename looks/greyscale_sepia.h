@@ -10,7 +10,4 @@ namespace pfx {
 extern const uint8_t kSepiaRed[256];
 extern const uint8_t kSepiaBlue[256];
 
-// One pixel through both curves: red lifted, blue lowered, green and alpha kept.
-uint32_t sepia_pixel(uint32_t p);
-
 }  // namespace pfx

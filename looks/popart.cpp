@@ -75,37 +75,34 @@ class Posterise {
 constexpr int32_t kPreviewHue[4] = {45, 300, 180, 90};
 
 // Value kept, saturation raised by 10000 (held below full), hue fixed per quadrant.
-uint32_t preview_recolour(Quadrant q, uint32_t s) {
+constexpr auto preview_recolour = [](Quadrant q, uint32_t s) {
   const Hsv hsv = rgb_to_hsv(red_of(s), green_of(s), blue_of(s));
   const int32_t sat = hsv.s + 10000 > 65535 ? 65535 : hsv.s + 10000;
-  const Rgb c = hsv_to_rgb(kPreviewHue[q], sat, hsv.v);
-  return pack(s, c.r, c.g, c.b);
-}
+  return pack(s, hsv_to_rgb(kPreviewHue[q], sat, hsv.v));
+};
 
 // The poster layout. The half-size copy is made into the top-left quadrant first and the other
 // three quadrants are recoloured from it before it is recoloured itself. Each write lands at or
-// before the source pixels still to be read, so dst may be the source.
-template <class Recolour>
+// before the source pixels still to be read, so dst may be the source. Each run of a quadrant's
+// row goes through recolour_run(from, to, n, quadrant).
+template <class RecolourRun>
 void poster(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
-            const Recolour& recolour) {
+            const RecolourRun& recolour_run) {
   const size_t w = static_cast<size_t>(width), h = static_cast<size_t>(height);
   const size_t qw = (w >> 1) + (w & 1), qh = (h >> 1) + (h & 1);
   for (size_t y = 0; y < qh; ++y) {
     uint32_t* row = dst + y * w;
     const uint32_t* from = src + 2 * y * w;
     for (size_t x = 0; x < qw; ++x) row[x] = from[2 * x];
-    for (size_t x = qw; x < w; ++x) row[x] = recolour(kTopRight, row[x - qw]);
+    recolour_run(row, row + qw, w - qw, kTopRight);
   }
   for (size_t y = qh; y < h; ++y) {
     uint32_t* row = dst + y * w;
     const uint32_t* copy = dst + (y - qh) * w;
-    for (size_t x = 0; x < qw; ++x) row[x] = recolour(kBottomLeft, copy[x]);
-    for (size_t x = qw; x < w; ++x) row[x] = recolour(kBottomRight, copy[x - qw]);
+    recolour_run(copy, row, qw, kBottomLeft);
+    recolour_run(copy, row + qw, w - qw, kBottomRight);
   }
-  for (size_t y = 0; y < qh; ++y) {
-    uint32_t* row = dst + y * w;
-    for (size_t x = 0; x < qw; ++x) row[x] = recolour(kTopLeft, row[x]);
-  }
+  for (size_t y = 0; y < qh; ++y) recolour_run(dst + y * w, dst + y * w, qw, kTopLeft);
 }
 
 bool poster_args_ok(const uint32_t* src, const uint32_t* dst, int32_t width, int32_t height) {
@@ -121,12 +118,21 @@ extern "C" {
 
 void fx_apply_popart(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::poster_args_ok(src, dst, width, height)) return;
-  pfx::poster(src, dst, width, height, pfx::Posterise());
+  // The palette lookup stays a scalar loop: as vector gathers it would be slower.
+  const pfx::Posterise posterise;
+  pfx::poster(src, dst, width, height,
+              [&](const uint32_t* from, uint32_t* to, size_t n, pfx::Quadrant q) {
+                for (size_t x = 0; x < n; ++x) to[x] = posterise(q, from[x]);
+              });
 }
 
 void fx_apply_popart_prev(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::poster_args_ok(src, dst, width, height)) return;
-  pfx::poster(src, dst, width, height, pfx::preview_recolour);
+  // The HSV round trip vectorises in the frame's pixel loop.
+  pfx::poster(
+      src, dst, width, height, [](const uint32_t* from, uint32_t* to, size_t n, pfx::Quadrant q) {
+        pfx::map_pixels(from, to, n, [q](uint32_t s) { return pfx::preview_recolour(q, s); });
+      });
 }
 
 void applyPopArt(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {

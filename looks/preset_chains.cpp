@@ -1,16 +1,26 @@
 // The six one-touch preset looks: retro, sunshine, downlight, bluewash, nostalgia, yellow glow.
 //
-// Each look is a fixed chain of the slider adjustments' full variants with fixed levels: the
-// first pass reads the source and writes the destination, every later pass works on the
-// destination in place. The character of a look is nothing but its order of passes and their
-// levels. Downlight's second pass is auto adjust, so it follows the module's auto-adjust
+// Each look is a fixed chain of the slider adjustments with fixed levels, each pass working on
+// the previous one's result. The character of a look is nothing but its order of passes and
+// their levels. Downlight's second pass is auto adjust, so it follows the module's auto-adjust
 // parameters; the other looks read no module state. A pass that refuses or fails (auto adjust
 // without memory) leaves its input as it was and the chain goes on.
+//
+// Every pass but auto adjust works pixel by pixel, so a run of such passes is one function of
+// each pixel: the looks make it in one pass over the image, handing each rule's channels to the
+// next in registers, which gives the same pixels as one full-image pass per adjustment (none of
+// the fixed levels is refused) at the memory cost of one.
 //
 // The partial variants share preset compositing (looks/preset.h).
 #include <cstdint>
 
+#include "adjust/brightness_contrast.h"
+#include "adjust/exposure_hue.h"
+#include "adjust/faded_invert.h"
+#include "adjust/gains_colortone.h"
+#include "adjust/saturation_temperature.h"
 #include "frame/frame.h"
+#include "frame/pixel.h"
 #include "looks/preset.h"
 #include "photofx.h"
 
@@ -30,59 +40,49 @@ extern "C" {
 
 void fx_apply_retro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  fx_control_saturation_all(src, dst, width, height, 5);
-  fx_control_brightness_all(dst, dst, width, height, 12);
-  fx_control_fadedcolor_all(dst, dst, width, height, 50);
-  fx_control_saturation_all(dst, dst, width, height, 7);
-  fx_control_contrast_all(dst, dst, width, height, 9);
-  fx_control_brightness_all(dst, dst, width, height, 11);
-  fx_control_contrast_all(dst, dst, width, height, 12);
+  pfx::for_each_pixel(
+      src, dst, width, height,
+      pfx::on_pixels(pfx::Saturation(5), pfx::Brightness(12), pfx::Fade(50), pfx::Saturation(7),
+                     pfx::Contrast(9), pfx::Brightness(11), pfx::Contrast(12)));
 }
 
 void fx_apply_sunshine(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  fx_control_contrast_all(src, dst, width, height, 11);
-  fx_control_temperature_all(dst, dst, width, height, 14);
-  fx_adjust_RGB_all(dst, dst, width, height, 11, 12, 8);
-  fx_control_contrast_all(dst, dst, width, height, 11);
+  pfx::for_each_pixel(src, dst, width, height,
+                      pfx::on_pixels(pfx::Contrast(11), pfx::Temperature(14), pfx::Gains(11, 12, 8),
+                                     pfx::Contrast(11)));
 }
 
+// Auto adjust looks at the whole image, so the chain is made in three parts: the faded pass,
+// auto adjust in place, then the remaining passes fused into one.
 void fx_apply_downlight(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
   fx_control_fadedcolor_all(src, dst, width, height, 50);
   fx_process_hdr(dst, dst, width, height);
-  fx_control_contrast_all(dst, dst, width, height, 9);
-  fx_control_saturation_all(dst, dst, width, height, 7);
-  fx_adjust_RGB_all(dst, dst, width, height, 9, 9, 9);
-  fx_control_exposure_all(dst, dst, width, height, 13);
+  pfx::for_each_pixel(
+      dst, dst, width, height,
+      pfx::on_pixels(pfx::Contrast(9), pfx::Saturation(7), pfx::Gains(9, 9, 9), pfx::Exposure(13)));
 }
 
 void fx_apply_bluewash(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  fx_control_contrast_all(src, dst, width, height, 12);
-  fx_control_saturation_all(dst, dst, width, height, 7);
-  fx_control_temperature_all(dst, dst, width, height, 6);
-  fx_control_exposure_all(dst, dst, width, height, 11);
-  fx_adjust_RGB_all(dst, dst, width, height, 10, 9, 11);
+  pfx::for_each_pixel(src, dst, width, height,
+                      pfx::on_pixels(pfx::Contrast(12), pfx::Saturation(7), pfx::Temperature(6),
+                                     pfx::Exposure(11), pfx::Gains(10, 9, 11)));
 }
 
 void fx_apply_nostalgia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  fx_control_brightness_all(src, dst, width, height, 12);
-  fx_control_fadedcolor_all(dst, dst, width, height, 50);
-  fx_control_exposure_all(dst, dst, width, height, 11);
-  fx_control_saturation_all(dst, dst, width, height, 7);
-  fx_control_temperature_all(dst, dst, width, height, 13);
+  pfx::for_each_pixel(src, dst, width, height,
+                      pfx::on_pixels(pfx::Brightness(12), pfx::Fade(50), pfx::Exposure(11),
+                                     pfx::Saturation(7), pfx::Temperature(13)));
 }
 
 void fx_apply_yellowglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  fx_control_fadedcolor_all(src, dst, width, height, 50);
-  fx_control_temperature_all(dst, dst, width, height, 12);
-  fx_control_exposure_all(dst, dst, width, height, 13);
-  fx_control_saturation_all(dst, dst, width, height, 8);
-  fx_adjust_RGB_all(dst, dst, width, height, 13, 14, 9);
-  fx_control_contrast_all(dst, dst, width, height, 13);
+  pfx::for_each_pixel(src, dst, width, height,
+                      pfx::on_pixels(pfx::Fade(50), pfx::Temperature(12), pfx::Exposure(13),
+                                     pfx::Saturation(8), pfx::Gains(13, 14, 9), pfx::Contrast(13)));
 }
 
 void fx_apply_retro_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,

@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "frame/dispatch.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
 #include "frame/pixel.h"
@@ -33,7 +34,7 @@ class ValueCurve {
       out_[v] = clamp_byte(((level * v * v) / 128 + (100 - level) * v) / 100);
     }
   }
-  int32_t operator[](int32_t v) const { return out_[v]; }
+  const int32_t* table() const { return out_; }
 
  private:
   int32_t out_[256];
@@ -44,27 +45,51 @@ struct Rows {
   const uint32_t *above, *row, *below;
 };
 
-uint32_t glow_pixel(const Rows& rows, size_t x, bool blur, const ValueCurve& curve) {
-  const uint32_t p = rows.row[x];
-  int32_t r = red_of(p), g = green_of(p), b = blue_of(p);
-  if (blur) {
-    const uint32_t* line[3] = {rows.above, rows.row, rows.below};
-    r <<= 4;
-    g <<= 4;
-    b <<= 4;
-    for (int32_t k = 0; k < 8; ++k) {
-      const uint32_t q = line[kRowOffset[k] + 1][static_cast<ptrdiff_t>(x) + kColumnOffset[k]];
-      r += red_of(q) << kWeightShift[k];
-      g += green_of(q) << kWeightShift[k];
-      b += blue_of(q) << kWeightShift[k];
-    }
-    r /= 36;
-    g /= 36;
-    b /= 36;
-  }
+// HSV value through the curve, and back; p supplies the alpha.
+[[gnu::always_inline]] inline uint32_t glow_colour(uint32_t p, int32_t r, int32_t g, int32_t b,
+                                                   const int32_t* curve) {
   const Hsv hsv = rgb_to_hsv(r, g, b);
-  const Rgb c = hsv_to_rgb(hsv.h, hsv.s, curve[hsv.v]);
-  return pack(p, c.r, c.g, c.b);
+  return pack(p, hsv_to_rgb(hsv.h, hsv.s, curve[hsv.v]));
+}
+
+// x / 36 for 0 <= x < 2^14 (a weighted sum is at most 36 * 255): with M = ceil(2^19 / 36) =
+// 14564, M * 36 - 2^19 = 16 is below 2^(19 - 14), so x * M / 2^19 exceeds x / 36 by less than
+// 1 / 36 and never reaches the next integer. A multiplication vectorises; a division does not.
+constexpr int32_t div36(int32_t x) { return (x * 14564) >> 19; }
+
+// A pixel with all eight neighbours: the weighted average of its 3 x 3 neighbourhood, glowed.
+[[gnu::always_inline]] inline uint32_t blurred_glow(const Rows& rows, size_t x,
+                                                    const int32_t* curve) {
+  const uint32_t p = rows.row[x];
+  int32_t r = red_of(p) << 4, g = green_of(p) << 4, b = blue_of(p) << 4;
+  for (int32_t k = 0; k < 8; ++k) {
+    const uint32_t* line =
+        kRowOffset[k] < 0 ? rows.above : (kRowOffset[k] > 0 ? rows.below : rows.row);
+    const uint32_t q = line[static_cast<ptrdiff_t>(x) + kColumnOffset[k]];
+    r += red_of(q) << kWeightShift[k];
+    g += green_of(q) << kWeightShift[k];
+    b += blue_of(q) << kWeightShift[k];
+  }
+  return glow_colour(p, div36(r), div36(g), div36(b), curve);
+}
+
+// Columns begin..end - 1 of a row whose pixels all have their eight neighbours: the loop that
+// takes most of the time, kept free of edge tests so that it vectorises. With kMasked only the
+// pixels whose mask byte is exactly 1 change; out holds the source copy elsewhere. out never
+// overlaps the rows read (when dst is the source they are saved copies) nor the curve, which
+// lets the curve's reads become vector gathers.
+template <bool kMasked>
+PFX_WIDE_VECTOR_CLONES static void glow_interior(Rows rows, uint32_t* __restrict out,
+                                                 const uint8_t* mask, size_t begin, size_t end,
+                                                 const int32_t* __restrict curve) {
+  for (size_t x = begin; x < end; ++x) {
+    const uint32_t q = blurred_glow(rows, x, curve);
+    if constexpr (kMasked) {
+      out[x] = mask[x] == 1 ? q : out[x];
+    } else {
+      out[x] = q;
+    }
+  }
 }
 
 // Source rows as they were before the call. With separate buffers they are read from src
@@ -109,21 +134,41 @@ class SourceRows {
 
 bool level_ok(int32_t level) { return level >= 0 && level <= 100; }
 
-// Glows the pixels of rows top..bottom, columns left..right (already inside the image) for
-// which selected(i) holds, reading the untouched source throughout.
-template <class Selected>
-void glow(SourceRows& source, uint32_t* dst, int32_t width, int32_t height, Rect r,
-          const ValueCurve& curve, Selected&& selected) {
+// Glows the pixels of rows top..bottom, columns left..right (already inside the image), all of
+// them or, given a mask, those whose mask byte is exactly 1, reading the untouched source
+// throughout. Pixels on the image's edge are not blurred.
+void glow(SourceRows& source, uint32_t* dst, const uint8_t* mask, int32_t width, int32_t height,
+          Rect r, const ValueCurve& curve) {
+  if (r.left > r.right) return;
   const size_t w = static_cast<size_t>(width);
+  const int32_t* table = curve.table();
   for (int32_t y = r.top; y <= r.bottom; ++y) {
     const Rows rows = source.at(static_cast<size_t>(y), static_cast<size_t>(r.top));
-    const bool row_inside = y >= 1 && y < height - 1;
     uint32_t* out = dst + static_cast<size_t>(y) * w;
-    for (int32_t x = r.left; x <= r.right; ++x) {
+    const uint8_t* row_mask = mask != nullptr ? mask + static_cast<size_t>(y) * w : nullptr;
+    auto edge = [&](int32_t x) {
       const size_t xs = static_cast<size_t>(x);
-      if (!selected(static_cast<size_t>(y) * w + xs)) continue;
-      out[xs] = glow_pixel(rows, xs, row_inside && x >= 1 && x < width - 1, curve);
+      if (row_mask != nullptr && row_mask[xs] != 1) return;
+      const uint32_t p = rows.row[xs];
+      out[xs] = glow_colour(p, red_of(p), green_of(p), blue_of(p), table);
+    };
+    if (y < 1 || y >= height - 1) {
+      for (int32_t x = r.left; x <= r.right; ++x) edge(x);
+      continue;
     }
+    // Interior columns 1 .. width - 2 of this row, within the rectangle.
+    const int32_t first = r.left > 1 ? r.left : 1;
+    const int32_t last = r.right < width - 2 ? r.right : width - 2;
+    if (r.left == 0) edge(0);
+    if (first <= last) {
+      const size_t b = static_cast<size_t>(first), e = static_cast<size_t>(last) + 1;
+      if (row_mask != nullptr) {
+        glow_interior<true>(rows, out, row_mask, b, e, table);
+      } else {
+        glow_interior<false>(rows, out, nullptr, b, e, table);
+      }
+    }
+    if (r.right == width - 1 && width > 1) edge(width - 1);
   }
 }
 
@@ -140,8 +185,8 @@ int32_t fx_softglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t h
   if (n == 0) return PHOTOFX_SUCCESS;
   pfx::SourceRows source(src, dst, width, height);
   if (source.failed()) return PHOTOFX_OUT_OF_MEMORY;
-  pfx::glow(source, dst, width, height, {0, width - 1, 0, height - 1}, pfx::ValueCurve(level),
-            [](size_t) { return true; });
+  pfx::glow(source, dst, nullptr, width, height, {0, width - 1, 0, height - 1},
+            pfx::ValueCurve(level));
   return PHOTOFX_SUCCESS;
 }
 
@@ -159,11 +204,9 @@ int32_t fx_softglow_partial(const uint32_t* src, const uint8_t* mask, uint32_t* 
   pfx::copy_image(src, dst, n);
   const pfx::ValueCurve curve(level);
   if (!pfx::is_region(bounds)) {
-    pfx::glow(source, dst, width, height, {0, width - 1, 0, height - 1}, curve,
-              [](size_t) { return true; });
+    pfx::glow(source, dst, nullptr, width, height, {0, width - 1, 0, height - 1}, curve);
   } else {
-    pfx::glow(source, dst, width, height, pfx::clip_to_image(bounds, width, height), curve,
-              [mask](size_t i) { return mask[i] == 1; });
+    pfx::glow(source, dst, mask, width, height, pfx::clip_to_image(bounds, width, height), curve);
   }
   return PHOTOFX_SUCCESS;
 }

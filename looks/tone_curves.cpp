@@ -16,7 +16,7 @@
 namespace pfx {
 namespace {
 
-// The channels a selector picks get curve(c); the others keep c.
+// The channels a selector picks get curve(c); the others keep c. The table form, for any curve.
 template <class Curve>
 ChannelMap selected_channels(int32_t channel, const Curve& curve) {
   const bool red = channel == 0 || channel == 1;
@@ -25,6 +25,34 @@ ChannelMap selected_channels(int32_t channel, const Curve& curve) {
   return ChannelMap([&](int32_t c) { return red ? curve(c) : c; },
                     [&](int32_t c) { return green ? curve(c) : c; },
                     [&](int32_t c) { return blue ? curve(c) : c; });
+}
+
+// The same, with the curve worked out per pixel: for curves of a few integer operations, which
+// vectorise where the three table reads of the table form do not.
+template <class Curve>
+auto selected_channels_arithmetic(int32_t channel, Curve curve) {
+  const bool red = channel == 0 || channel == 1;
+  const bool green = channel == 0 || channel == 2;
+  const bool blue = channel == 0 || channel == 3;
+  return [=](uint32_t p) {
+    const int32_t r = red_of(p), g = green_of(p), b = blue_of(p);
+    return pack(p, red ? curve(r) : r, green ? curve(g) : g, blue ? curve(b) : b);
+  };
+}
+
+// Levels within 0 <= low < high <= 255, the range the looks use, keep every product within 32
+// bits and take the arithmetic form; other levels take the table, made in 64 bits.
+constexpr bool levels_in_byte_range(int32_t low, int32_t high) {
+  return low >= 0 && low < high && high <= 255;
+}
+
+// The full-variant frame for the table form.
+void map_image(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+               const ChannelMap& map) {
+  if (src == nullptr || dst == nullptr) return;
+  const int64_t n = pixel_count(width, height);
+  if (n > kMaxPixels) return;
+  map_channels(map, src, dst, static_cast<size_t>(n));
 }
 
 // n / 255 to the power 1 / gamma, scaled back to 0..255 and rounded half up. The clamp is made in
@@ -47,8 +75,8 @@ void control_gamma(const uint32_t* src, uint32_t* dst, int32_t width, int32_t he
   if (src == nullptr || dst == nullptr) return;
   int32_t curve[256];
   for (int32_t n = 0; n < 256; ++n) curve[n] = pfx::gamma_entry(n, gamma);
-  pfx::for_each_pixel(src, dst, width, height,
-                      pfx::selected_channels(channel, [&](int32_t c) { return curve[c]; }));
+  pfx::map_image(src, dst, width, height,
+                 pfx::selected_channels(channel, [&](int32_t c) { return curve[c]; }));
 }
 
 // The level arithmetic is done in 64 bits: for 0 <= low < high <= 255 it gives the same values
@@ -57,20 +85,36 @@ void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, i
                             int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;  // no range to stretch; dst is left as it was
   const int64_t scale = 261120 / (int64_t{high} - low);
-  pfx::for_each_pixel(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
-                        const int64_t v = (scale * (c - int64_t{low})) >> 10;
-                        return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                      }));
+  if (pfx::levels_in_byte_range(low, high)) {
+    const int32_t s32 = static_cast<int32_t>(scale);
+    pfx::for_each_pixel(src, dst, width, height,
+                        pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
+                          return pfx::clamp_byte((s32 * (c - low)) >> 10);
+                        }));
+    return;
+  }
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
+                   const int64_t v = (scale * (c - int64_t{low})) >> 10;
+                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
+                 }));
 }
 
 void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                              int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;
   const int64_t scale = (int64_t{high} - low) * 1024 / 255;
-  pfx::for_each_pixel(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
-                        const int64_t v = ((scale * c) >> 10) + low;
-                        return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                      }));
+  if (pfx::levels_in_byte_range(low, high)) {
+    const int32_t s32 = static_cast<int32_t>(scale);
+    pfx::for_each_pixel(src, dst, width, height,
+                        pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
+                          return pfx::clamp_byte(((s32 * c) >> 10) + low);
+                        }));
+    return;
+  }
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
+                   const int64_t v = ((scale * c) >> 10) + low;
+                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
+                 }));
 }
 
 }  // extern "C"
