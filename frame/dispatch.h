@@ -11,8 +11,7 @@
 // Elsewhere (ARM, clang) the macro is empty and the one portable version is built.
 #pragma once
 
-#if defined(__GNUC__) && !defined(__clang__) && defined(__x86_64__) && \
-    !defined(PHOTOFX_NO_CLONES)
+#if defined(__GNUC__) && !defined(__clang__) && defined(__x86_64__) && !defined(PHOTOFX_NO_CLONES)
 #define PFX_VECTOR_CLONES __attribute__((target_clones("avx2", "default"), noinline))
 #else
 #define PFX_VECTOR_CLONES
