@@ -4,8 +4,10 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <vector>
 
 #include "blur/composite.h"
+#include "blur/gaussian.h"
 
 namespace pfx::reference {
 
@@ -44,6 +46,44 @@ inline void composite(const uint32_t* src, const uint8_t* blur, const uint8_t* m
       }
       dst[i] = out;
     }
+  }
+}
+
+// The nine-tap blur one output sample at a time, each tap tested for the image edge and the area,
+// one division per channel. Level as the library takes it.
+inline void gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32_t width,
+                          int32_t height, int32_t level) {
+  const uint32_t l = static_cast<uint32_t>(level) > 7u ? 8u : static_cast<uint32_t>(level);
+  const int32_t lo = -static_cast<int32_t>((l + 1) / 2), hi = static_cast<int32_t>(l / 2);
+  auto line = [&](const uint8_t* in, size_t centre, int32_t pos, int32_t len, ptrdiff_t stride,
+                  uint8_t* out) {
+    int32_t sum[3] = {0, 0, 0};
+    int32_t weight = 0;
+    const uint8_t* c = in + 3 * centre;
+    for (int32_t o = lo; o <= hi; ++o) {
+      if (pos + o < 0 || pos + o >= len) continue;
+      const ptrdiff_t t = static_cast<ptrdiff_t>(centre) + stride * o;
+      if (depth == nullptr || depth[t] == 1) {
+        const int32_t k = kBlurKernel[o < 0 ? -o : o];
+        for (int ch = 0; ch < 3; ++ch) sum[ch] += k * in[3 * t + ch];
+        weight += k;
+      } else {
+        for (int ch = 0; ch < 3; ++ch) sum[ch] += 9 * c[ch];
+        weight += 9;
+      }
+    }
+    for (int ch = 0; ch < 3; ++ch) {
+      const int32_t v = ((sum[ch] * 1024) / weight) >> 10;
+      out[ch] = static_cast<uint8_t>(v > 254 ? 255 : (v < 0 ? 0 : v));
+    }
+  };
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  std::vector<uint8_t> scratch(3 * n);
+  for (size_t i = 0; i < n; ++i) {
+    line(src, i, static_cast<int32_t>(i % width), width, 1, scratch.data() + 3 * i);
+  }
+  for (size_t i = 0; i < n; ++i) {
+    line(scratch.data(), i, static_cast<int32_t>(i / width), height, width, dst + 3 * i);
   }
 }
 
