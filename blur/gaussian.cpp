@@ -30,96 +30,74 @@ constexpr Window window_for(int32_t level) {
   return {-static_cast<int32_t>((l + 1) / 2), static_cast<int32_t>(l / 2)};
 }
 
-// Running sums of one line of outputs, every channel and the weights, a tap at a time.
-struct Sums {
-  int32_t* inside;   // kernel weight of the taps inside the area
-  int32_t* outside;  // count of taps in the image but outside the area
-  int32_t* channel[3];
+constexpr int32_t kTaps = 9;
+
+// The nine taps of one line of outputs: for tap t, output x reads present[t][x] (1 where the tap
+// lies in the image), inside[t][x] (1 where it lies inside the area) and v[c][t][x]. A tap
+// outside the level's window, or beyond the edge, has kernel weight 0 and active 0, and so
+// contributes nothing however its bytes read.
+struct Taps {
+  const uint8_t* present[kTaps];
+  const uint8_t* inside[kTaps];
+  const uint8_t* v[3][kTaps];
+  uint16_t k[kTaps];
+  uint16_t active[kTaps];
 };
 
-// Adds one tap to every output of a line: `present` is 1 where the tap lies in the image, `in`
-// 1 where it lies inside the area, v0..v2 hold its channels. The first tap sets the sums instead
-// of adding to them. The sums are separate arrays, as __restrict tells the compiler, so the
-// loop vectorises across the line.
-PFX_VECTOR_CLONES void add_tap(int32_t n, int32_t k, bool first, const uint8_t* present,
-                               const uint8_t* in, const uint8_t* v0, const uint8_t* v1,
-                               const uint8_t* v2, int32_t* __restrict inside,
-                               int32_t* __restrict outside, int32_t* __restrict s0,
-                               int32_t* __restrict s1, int32_t* __restrict s2) {
-  if (first) {
-    for (int32_t x = 0; x < n; ++x) inside[x] = outside[x] = s0[x] = s1[x] = s2[x] = 0;
-  }
+// Blurs one line: each tap inside the area adds its kernel weight times its channels, each
+// other tap in the window stands for the centre sample with weight 9, so the weight is 9..81
+// and the result the sum over the weight. All nine taps are summed in registers, and the loop
+// vectorises across the line (the outputs are __restrict, so they cannot move the inputs).
+PFX_VECTOR_CLONES void blur_line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
+                                 const uint8_t* c2, uint8_t* __restrict o0, uint8_t* __restrict o1,
+                                 uint8_t* __restrict o2) {
+  const Taps t = taps;
   for (int32_t x = 0; x < n; ++x) {
-    const int32_t d = in[x];
-    const int32_t kd = k * d;
-    inside[x] += kd;
-    outside[x] += present[x] - d;
-    s0[x] += kd * v0[x];
-    s1[x] += kd * v1[x];
-    s2[x] += kd * v2[x];
-  }
-}
-
-void add_tap(const Sums& s, int32_t n, int32_t k, bool first, const uint8_t* present,
-             const uint8_t* in, const uint8_t* const v[3]) {
-  add_tap(n, k, first, present, in, v[0], v[1], v[2], s.inside, s.outside, s.channel[0],
-          s.channel[1], s.channel[2]);
-}
-
-// Each tap outside the area stands for the centre sample with weight 9, so the weight is 9..81.
-// Replaces the weights of a line by their reciprocals and the outside counts by the centre's
-// share (a table lookup per output, shared by the three channels).
-void weigh_line(const Sums& s, int32_t n) {
-  for (int32_t x = 0; x < n; ++x) {
-    const int32_t stand_in = 9 * s.outside[x];
-    s.inside[x] = static_cast<int32_t>(kBlurReciprocal[s.inside[x] + stand_in]);
-    s.outside[x] = stand_in;
-  }
-}
-
-// One blurred channel of a weighed line, from the channel's sums and centre samples.
-PFX_VECTOR_CLONES void finish_channel(int32_t n, const int32_t* __restrict reciprocal,
-                                      const int32_t* __restrict stand_in,
-                                      const int32_t* __restrict sum, const uint8_t* centre,
-                                      uint8_t* __restrict out) {
-  for (int32_t x = 0; x < n; ++x) {
-    const uint32_t total = static_cast<uint32_t>(sum[x] + stand_in[x] * centre[x]);
-    out[x] = static_cast<uint8_t>((total * static_cast<uint32_t>(reciprocal[x])) >>
-                                  kBlurReciprocalShift);
-  }
-}
-
-void finish_line(const Sums& s, int32_t n, const uint8_t* const centre[3], uint8_t* const out[3]) {
-  weigh_line(s, n);
-  for (int c = 0; c < 3; ++c) {
-    finish_channel(n, s.inside, s.outside, s.channel[c], centre[c], out[c]);
+    // Every sum fits 16 bits (channels at most 255 x 55, weights at most 55, counts at most
+    // 9), and 16-bit lanes hold twice as many outputs per vector.
+    uint16_t inside = 0, outside = 0, s0 = 0, s1 = 0, s2 = 0;
+    for (int32_t i = 0; i < kTaps; ++i) {
+      const uint16_t d = t.inside[i][x];
+      const uint16_t kd = static_cast<uint16_t>(t.k[i] * d);
+      inside = static_cast<uint16_t>(inside + kd);
+      outside = static_cast<uint16_t>(outside + t.active[i] * (t.present[i][x] - d));
+      s0 = static_cast<uint16_t>(s0 + kd * t.v[0][i][x]);
+      s1 = static_cast<uint16_t>(s1 + kd * t.v[1][i][x]);
+      s2 = static_cast<uint16_t>(s2 + kd * t.v[2][i][x]);
+    }
+    const int32_t stand_in = 9 * outside;  // the sums and products below stay within 2^32
+    const uint32_t r = kBlurReciprocal[inside + stand_in];
+    o0[x] = static_cast<uint8_t>((static_cast<uint32_t>(s0 + stand_in * c0[x]) * r) >>
+                                 kBlurReciprocalShift);
+    o1[x] = static_cast<uint8_t>((static_cast<uint32_t>(s1 + stand_in * c1[x]) * r) >>
+                                 kBlurReciprocalShift);
+    o2[x] = static_cast<uint8_t>((static_cast<uint32_t>(s2 + stand_in * c2[x]) * r) >>
+                                 kBlurReciprocalShift);
   }
 }
 
 }  // namespace
 
-// Both passes sum the taps of whole lines at a time: the tap offset is fixed across a line, so
-// each tap is one pass of multiply-adds the compiler vectorises, and the division becomes a
-// multiplication by the weight's reciprocal. The horizontal pass leaves the image as three
-// planes, so that the vertical pass reads whole rows of one channel.
+// Both passes sum all nine taps of an output at once, across a whole line, with taps outside
+// the level's window weighted 0; the division by the weight is a multiplication by its
+// reciprocal. The horizontal pass leaves the image as three planes, so that the vertical pass
+// reads whole rows of one channel.
 bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32_t width,
                    int32_t height, int32_t level) {
   if (src == nullptr || dst == nullptr) return false;
   const int64_t n = pixel_count(width, height);
   if (n == 0 || n > kMaxPixels) return false;
-  // One block: five sum rows, the three planes, a plane of inside flags, and five padded rows
-  // holding a source row's presence, inside flags and channels.
+  // One block: the three planes, a plane of inside flags, and five padded rows holding a source
+  // row's presence, inside flags and channels (the last three reused for a row of results).
   constexpr int32_t kPad = 4;
   const int64_t padded = int64_t{width} + 2 * kPad;
-  const int64_t bytes = 20 * int64_t{width} + 4 * n + 5 * padded;
+  const int64_t bytes = 4 * n + 5 * padded;
   if (bytes > int64_t{UINT32_MAX}) return false;
   auto* block = static_cast<uint8_t*>(fx_malloc(static_cast<uint32_t>(bytes), 1));
   if (block == nullptr) return false;
   const size_t w = static_cast<size_t>(width), pw = static_cast<size_t>(padded);
   const size_t samples = static_cast<size_t>(n);
-  int32_t* sums = reinterpret_cast<int32_t*>(block);
-  const Sums s{sums, sums + w, {sums + 2 * w, sums + 3 * w, sums + 4 * w}};
-  uint8_t* plane[3] = {block + 20 * w, block + 20 * w + samples, block + 20 * w + 2 * samples};
+  uint8_t* plane[3] = {block, block + samples, block + 2 * samples};
   uint8_t* flags = plane[2] + samples;
   uint8_t* present = flags + samples;  // 1 inside the line, 0 in the padding
   uint8_t* inside = present + pw;      // and each padded row likewise: 0 in the padding
@@ -131,7 +109,18 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
   }
 
   const Window win = window_for(level);
-  // Horizontal pass, into the planes; it reads only src, so dst may be src.
+  Taps taps{};
+  // Horizontal pass, into the planes; it reads only src, so dst may be src. Tap t of output x
+  // is padded sample x + t, that is offset t - 4.
+  for (int32_t i = 0; i < kTaps; ++i) {
+    const int32_t o = i - kPad;
+    const bool in_window = o >= win.lo && o <= win.hi;
+    taps.present[i] = present + i;
+    taps.inside[i] = inside + i;
+    for (int c = 0; c < 3; ++c) taps.v[c][i] = value[c] + i;
+    taps.k[i] = static_cast<uint16_t>(in_window ? kBlurKernel[o < 0 ? -o : o] : 0);
+    taps.active[i] = in_window ? 1 : 0;
+  }
   for (int32_t y = 0; y < height; ++y) {
     const size_t row = static_cast<size_t>(y) * w;
     const uint8_t* in = src + 3 * row;
@@ -139,31 +128,27 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
       inside[kPad + x] = flags[row + x];
       for (int c = 0; c < 3; ++c) value[c][kPad + x] = in[3 * x + c];
     }
-    for (int32_t o = win.lo; o <= win.hi; ++o) {
-      const uint8_t* v[3] = {value[0] + kPad + o, value[1] + kPad + o, value[2] + kPad + o};
-      add_tap(s, width, kBlurKernel[o < 0 ? -o : o], o == win.lo, present + kPad + o,
-              inside + kPad + o, v);
-    }
-    const uint8_t* centre[3] = {value[0] + kPad, value[1] + kPad, value[2] + kPad};
-    uint8_t* out[3] = {plane[0] + row, plane[1] + row, plane[2] + row};
-    finish_line(s, width, centre, out);
+    blur_line(width, taps, value[0] + kPad, value[1] + kPad, value[2] + kPad, plane[0] + row,
+              plane[1] + row, plane[2] + row);
   }
 
-  // Vertical pass, from the planes into dst, a row of outputs at a time.
+  // Vertical pass, from the planes into dst, a row of outputs at a time. Rows beyond the edge
+  // drop out whole; they are pointed at the centre row only to keep every read in bounds.
   const uint8_t* every = present + kPad;
   for (int32_t y = 0; y < height; ++y) {
-    // Rows beyond the edge drop out whole; the centre row is always there.
-    const int32_t lo = y + win.lo < 0 ? -y : win.lo;
-    const int32_t hi = y + win.hi >= height ? height - 1 - y : win.hi;
-    for (int32_t o = lo; o <= hi; ++o) {
-      const size_t row = static_cast<size_t>(y + o) * w;
-      const uint8_t* v[3] = {plane[0] + row, plane[1] + row, plane[2] + row};
-      add_tap(s, width, kBlurKernel[o < 0 ? -o : o], o == lo, every, flags + row, v);
+    for (int32_t i = 0; i < kTaps; ++i) {
+      const int32_t o = i - kPad;
+      const bool used = o >= win.lo && o <= win.hi && y + o >= 0 && y + o < height;
+      const size_t row = static_cast<size_t>(used ? y + o : y) * w;
+      taps.present[i] = every;
+      taps.inside[i] = flags + row;
+      for (int c = 0; c < 3; ++c) taps.v[c][i] = plane[c] + row;
+      taps.k[i] = static_cast<uint16_t>(used ? kBlurKernel[o < 0 ? -o : o] : 0);
+      taps.active[i] = used ? 1 : 0;
     }
     const size_t row = static_cast<size_t>(y) * w;
-    const uint8_t* centre[3] = {plane[0] + row, plane[1] + row, plane[2] + row};
-    uint8_t* out[3] = {value[0], value[1], value[2]};
-    finish_line(s, width, centre, out);
+    blur_line(width, taps, plane[0] + row, plane[1] + row, plane[2] + row, value[0], value[1],
+              value[2]);
     uint8_t* rgb = dst + 3 * row;
     for (size_t x = 0; x < w; ++x) {
       for (int c = 0; c < 3; ++c) rgb[3 * x + c] = value[c][x];
