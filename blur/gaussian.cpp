@@ -76,6 +76,25 @@ PFX_VECTOR_CLONES void blur_line(int32_t n, const Taps& taps, const uint8_t* c0,
   }
 }
 
+// Splits a row of red, green, blue samples into three channel rows, and joins them back.
+PFX_VECTOR_CLONES void split_row(const uint8_t* rgb, int32_t n, uint8_t* __restrict r,
+                                 uint8_t* __restrict g, uint8_t* __restrict b) {
+  for (int32_t x = 0; x < n; ++x) {
+    r[x] = rgb[3 * x];
+    g[x] = rgb[3 * x + 1];
+    b[x] = rgb[3 * x + 2];
+  }
+}
+
+PFX_VECTOR_CLONES void join_row(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n,
+                                uint8_t* __restrict rgb) {
+  for (int32_t x = 0; x < n; ++x) {
+    rgb[3 * x] = r[x];
+    rgb[3 * x + 1] = g[x];
+    rgb[3 * x + 2] = b[x];
+  }
+}
+
 }  // namespace
 
 // Both passes sum all nine taps of an output at once, across a whole line, with taps outside
@@ -124,10 +143,8 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
   for (int32_t y = 0; y < height; ++y) {
     const size_t row = static_cast<size_t>(y) * w;
     const uint8_t* in = src + 3 * row;
-    for (size_t x = 0; x < w; ++x) {
-      inside[kPad + x] = flags[row + x];
-      for (int c = 0; c < 3; ++c) value[c][kPad + x] = in[3 * x + c];
-    }
+    for (size_t x = 0; x < w; ++x) inside[kPad + x] = flags[row + x];
+    split_row(in, width, value[0] + kPad, value[1] + kPad, value[2] + kPad);
     blur_line(width, taps, value[0] + kPad, value[1] + kPad, value[2] + kPad, plane[0] + row,
               plane[1] + row, plane[2] + row);
   }
@@ -149,10 +166,7 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
     const size_t row = static_cast<size_t>(y) * w;
     blur_line(width, taps, plane[0] + row, plane[1] + row, plane[2] + row, value[0], value[1],
               value[2]);
-    uint8_t* rgb = dst + 3 * row;
-    for (size_t x = 0; x < w; ++x) {
-      for (int c = 0; c < 3; ++c) rgb[3 * x + c] = value[c][x];
-    }
+    join_row(value[0], value[1], value[2], width, dst + 3 * row);
   }
   fx_free(block);
   return true;
