@@ -14,30 +14,12 @@
 #include "frame/frame.h"
 #include "photofx.h"
 
-// Tells GCC that a loop carries no dependence between iterations, so that it vectorises it
-// without a runtime overlap check that would send in-place calls down the scalar path.
-#if defined(__GNUC__) && !defined(__clang__)
-#define PFX_NO_ALIAS_LOOP _Pragma("GCC ivdep")
-#else
-#define PFX_NO_ALIAS_LOOP
-#endif
-
 namespace pfx {
 
 namespace {
 
-// One working column's contribution to a full-size row, summed down the column: the two
-// samples the row lies between, each weighted by the row's fraction. A sample outside the
-// blurred area adds its weight to `own` instead, to be filled with the pixel's own colour.
-struct ColumnSum {
-  int32_t r, g, b, own;
-};
-
-// The expanded bilinear sum p00 (32-wx)(32-wy) + p01 wx (32-wy) + p10 (32-wx) wy + p11 wx wy
-// has no intermediate rounding, so it may be summed down the columns first (once per row and
-// working column) and across them second (once per pixel). Within the span of full-size columns
-// that lie between working columns j and j + 1 only the column fraction wx changes, so the
-// per-pixel work is a few multiply-adds the compiler can vectorise.
+// One row of the depth compositing, from its column sums. Within a span only the column
+// fraction wx changes, so the per-pixel work is a few multiply-adds the compiler vectorises.
 PFX_VECTOR_CLONES void composite_row(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                      const ColumnSum* sums, const int32_t* span_start,
                                      int32_t spans, int32_t xscale) {
@@ -66,40 +48,48 @@ PFX_VECTOR_CLONES void composite_row(const uint32_t* src, const uint8_t* mask, u
 
 }  // namespace
 
-void composite(const uint32_t* src, const uint8_t* blur, const uint8_t* mask, const uint8_t* depth,
-               uint32_t* dst, int32_t width, int32_t height, int32_t sw, int32_t sh,
-               bool every_pixel) {
-  const int32_t yscale = working_scale(sh, height);
-  const int32_t xscale = working_scale(sw, width);
-  // Full-size columns interpolated between working columns j and j + 1 run from span_start[j]
-  // to span_start[j + 1]; working_pos never decreases along a row, so each span is one run.
-  // The clamp at the right edge leaves the last span open to the end of the row.
+void working_spans(int32_t width, int32_t sw, int32_t xscale, int32_t* span_start) {
+  // working_pos never decreases along a row, so each span is one run of columns; the clamp at
+  // the right edge leaves the last span open to the end of the row.
   const int32_t spans = sw - 1;
-  int32_t span_start[kMaxWorkingSide];
-  ColumnSum sums[kMaxWorkingSide];
   int32_t x = 0;
   for (int32_t j = 0; j < spans; ++j) {
     while (x < width && working_pos(x, xscale, sw).index < j) ++x;
     span_start[j] = x;
   }
   span_start[spans] = width;
+}
 
+void column_sums(const uint8_t* blur, const uint8_t* depth, int32_t sw, WorkingPos py,
+                 ColumnSum* sums) {
   const size_t row_samples = static_cast<size_t>(sw);
+  const size_t top = static_cast<size_t>(py.index) * row_samples;
+  const size_t bottom = top + row_samples;
+  const int32_t wt = 32 - py.frac, wb = py.frac;
+  for (size_t j = 0; j < row_samples; ++j) {
+    const bool dt = depth == nullptr || depth[top + j] != 0;
+    const bool db = depth == nullptr || depth[bottom + j] != 0;
+    const uint8_t* t = blur + 3 * (top + j);
+    const uint8_t* b = blur + 3 * (bottom + j);
+    ColumnSum& c = sums[j];
+    c.r = (dt ? t[0] * wt : 0) + (db ? b[0] * wb : 0);
+    c.g = (dt ? t[1] * wt : 0) + (db ? b[1] * wb : 0);
+    c.b = (dt ? t[2] * wt : 0) + (db ? b[2] * wb : 0);
+    c.own = (dt ? 0 : wt) + (db ? 0 : wb);
+  }
+}
+
+void composite(const uint32_t* src, const uint8_t* blur, const uint8_t* mask, const uint8_t* depth,
+               uint32_t* dst, int32_t width, int32_t height, int32_t sw, int32_t sh,
+               bool every_pixel) {
+  const int32_t yscale = working_scale(sh, height);
+  const int32_t xscale = working_scale(sw, width);
+  const int32_t spans = sw - 1;
+  int32_t span_start[kMaxWorkingSide];
+  ColumnSum sums[kMaxWorkingSide];
+  working_spans(width, sw, xscale, span_start);
   for (int32_t y = 0; y < height; ++y) {
-    const WorkingPos py = working_pos(y, yscale, sh);
-    const size_t top = static_cast<size_t>(py.index) * row_samples;
-    const size_t bottom = top + row_samples;
-    const int32_t wt = 32 - py.frac, wb = py.frac;
-    for (size_t j = 0; j < row_samples; ++j) {
-      const bool dt = depth[top + j] != 0, db = depth[bottom + j] != 0;
-      const uint8_t* t = blur + 3 * (top + j);
-      const uint8_t* b = blur + 3 * (bottom + j);
-      ColumnSum& c = sums[j];
-      c.r = (dt ? t[0] * wt : 0) + (db ? b[0] * wb : 0);
-      c.g = (dt ? t[1] * wt : 0) + (db ? b[1] * wb : 0);
-      c.b = (dt ? t[2] * wt : 0) + (db ? b[2] * wb : 0);
-      c.own = (dt ? 0 : wt) + (db ? 0 : wb);
-    }
+    column_sums(blur, depth, sw, working_pos(y, yscale, sh), sums);
     const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
     composite_row(src + row, every_pixel ? nullptr : mask + row, dst + row, sums, span_start, spans,
                   xscale);

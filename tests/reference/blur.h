@@ -8,6 +8,8 @@
 
 #include "blur/composite.h"
 #include "blur/gaussian.h"
+#include "blur/tiltshift.h"
+#include "frame/pixel.h"
 
 namespace pfx::reference {
 
@@ -84,6 +86,37 @@ inline void gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth
   }
   for (size_t i = 0; i < n; ++i) {
     line(scratch.data(), i, static_cast<int32_t>(i / width), height, width, dst + 3 * i);
+  }
+}
+
+// The tilt-shift mix of the upscaled blur and the source, one pixel and channel at a time.
+inline void tilt_restore(const uint32_t* src, const uint8_t* blur, uint32_t* dst, int32_t width,
+                         int32_t height, int32_t sw, int32_t sh, const TiltBand& band) {
+  const int32_t yscale = working_scale(sh, height);
+  const int32_t xscale = working_scale(sw, width);
+  const size_t row_samples = static_cast<size_t>(sw);
+  for (int32_t y = 0; y < height; ++y) {
+    const int32_t w = band.weight(y);
+    const WorkingPos py = working_pos(y, yscale, sh);
+    const uint8_t* top = blur + 3 * static_cast<size_t>(py.index) * row_samples;
+    const uint8_t* bottom = top + 3 * row_samples;
+    const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+    for (int32_t x = 0; x < width; ++x) {
+      const size_t i = row + static_cast<size_t>(x);
+      const uint32_t s = src[i];
+      const WorkingPos px = working_pos(x, xscale, sw);
+      const size_t j = 3 * static_cast<size_t>(px.index);
+      uint32_t out = s & 0xFF000000u;
+      for (int32_t c = 0; c < 3; ++c) {
+        const int32_t shift = 16 - 8 * c;
+        const int32_t b = clamp_byte(bilinear(top[j + c], top[j + 3 + c], bottom[j + c],
+                                              bottom[j + 3 + c], px.frac, py.frac));
+        const int32_t own = static_cast<int32_t>((s >> shift) & 255u);
+        const int32_t v = clamp_byte((b * (256 - w) + own * w) >> 8);
+        out |= static_cast<uint32_t>(v) << shift;
+      }
+      dst[i] = out;
+    }
   }
 }
 
