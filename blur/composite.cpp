@@ -10,45 +10,89 @@
 #include <cstddef>
 
 #include "blur/workspace.h"
+#include "frame/dispatch.h"
 #include "frame/frame.h"
 #include "photofx.h"
 
 namespace pfx {
+
+namespace {
+
+// One row of the depth compositing, from its column sums. Within a span only the column
+// fraction wx changes, so the per-pixel work is a few multiply-adds the compiler vectorises.
+PFX_VECTOR_CLONES void composite_row(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                                     const ColumnSum* sums, const int32_t* span_start,
+                                     int32_t spans, int32_t xscale) {
+  for (int32_t j = 0; j < spans; ++j) {
+    const ColumnSum a = sums[j], b = sums[j + 1];
+    const int32_t r0 = a.r * 32, dr = b.r - a.r;
+    const int32_t g0 = a.g * 32, dg = b.g - a.g;
+    const int32_t b0 = a.b * 32, db = b.b - a.b;
+    const int32_t o0 = a.own * 32, dow = b.own - a.own;
+    const int32_t end = span_start[j + 1];
+    // Each pixel is read before it is written and no other is touched: safe when dst is src.
+    PFX_NO_ALIAS_LOOP
+    for (int32_t x = span_start[j]; x < end; ++x) {
+      const uint32_t s = src[x];
+      const int32_t wx = ((x * xscale) >> 10) & 31;  // the column's weight, as working_pos has it
+      const int32_t own = o0 + dow * wx;
+      const int32_t r = (r0 + dr * wx + static_cast<int32_t>((s >> 16) & 255u) * own) >> 10;
+      const int32_t g = (g0 + dg * wx + static_cast<int32_t>((s >> 8) & 255u) * own) >> 10;
+      const int32_t bl = (b0 + db * wx + static_cast<int32_t>(s & 255u) * own) >> 10;
+      const uint32_t out = (s & 0xFF000000u) | (static_cast<uint32_t>(r) << 16) |
+                           (static_cast<uint32_t>(g) << 8) | static_cast<uint32_t>(bl);
+      dst[x] = (mask == nullptr || mask[x] != 0) ? out : s;
+    }
+  }
+}
+
+}  // namespace
+
+void working_spans(int32_t width, int32_t sw, int32_t xscale, int32_t* span_start) {
+  // working_pos never decreases along a row, so each span is one run of columns; the clamp at
+  // the right edge leaves the last span open to the end of the row.
+  const int32_t spans = sw - 1;
+  int32_t x = 0;
+  for (int32_t j = 0; j < spans; ++j) {
+    while (x < width && working_pos(x, xscale, sw).index < j) ++x;
+    span_start[j] = x;
+  }
+  span_start[spans] = width;
+}
+
+void column_sums(const uint8_t* blur, const uint8_t* depth, int32_t sw, WorkingPos py,
+                 ColumnSum* sums) {
+  const size_t row_samples = static_cast<size_t>(sw);
+  const size_t top = static_cast<size_t>(py.index) * row_samples;
+  const size_t bottom = top + row_samples;
+  const int32_t wt = 32 - py.frac, wb = py.frac;
+  for (size_t j = 0; j < row_samples; ++j) {
+    const bool dt = depth == nullptr || depth[top + j] != 0;
+    const bool db = depth == nullptr || depth[bottom + j] != 0;
+    const uint8_t* t = blur + 3 * (top + j);
+    const uint8_t* b = blur + 3 * (bottom + j);
+    ColumnSum& c = sums[j];
+    c.r = (dt ? t[0] * wt : 0) + (db ? b[0] * wb : 0);
+    c.g = (dt ? t[1] * wt : 0) + (db ? b[1] * wb : 0);
+    c.b = (dt ? t[2] * wt : 0) + (db ? b[2] * wb : 0);
+    c.own = (dt ? 0 : wt) + (db ? 0 : wb);
+  }
+}
 
 void composite(const uint32_t* src, const uint8_t* blur, const uint8_t* mask, const uint8_t* depth,
                uint32_t* dst, int32_t width, int32_t height, int32_t sw, int32_t sh,
                bool every_pixel) {
   const int32_t yscale = working_scale(sh, height);
   const int32_t xscale = working_scale(sw, width);
-  const size_t row_samples = static_cast<size_t>(sw);
+  const int32_t spans = sw - 1;
+  int32_t span_start[kMaxWorkingSide];
+  ColumnSum sums[kMaxWorkingSide];
+  working_spans(width, sw, xscale, span_start);
   for (int32_t y = 0; y < height; ++y) {
-    const WorkingPos py = working_pos(y, yscale, sh);
-    const size_t top = static_cast<size_t>(py.index) * row_samples;
-    const size_t bottom = top + row_samples;
+    column_sums(blur, depth, sw, working_pos(y, yscale, sh), sums);
     const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
-    for (int32_t x = 0; x < width; ++x) {
-      const size_t i = row + static_cast<size_t>(x);
-      const uint32_t s = src[i];  // read once, before dst[i] is written: dst may be src
-      if (!every_pixel && mask[i] == 0) {
-        dst[i] = s;
-        continue;
-      }
-      const WorkingPos px = working_pos(x, xscale, sw);
-      const size_t j00 = top + static_cast<size_t>(px.index), j01 = j00 + 1;
-      const size_t j10 = bottom + static_cast<size_t>(px.index), j11 = j10 + 1;
-      const bool d00 = depth[j00] != 0, d01 = depth[j01] != 0;
-      const bool d10 = depth[j10] != 0, d11 = depth[j11] != 0;
-      uint32_t out = s & 0xFF000000u;
-      for (int32_t c = 0; c < 3; ++c) {
-        const int32_t shift = 16 - 8 * c;
-        const int32_t own = static_cast<int32_t>((s >> shift) & 255u);
-        const int32_t v = bilinear(d00 ? blur[3 * j00 + c] : own, d01 ? blur[3 * j01 + c] : own,
-                                   d10 ? blur[3 * j10 + c] : own, d11 ? blur[3 * j11 + c] : own,
-                                   px.frac, py.frac);
-        out |= (static_cast<uint32_t>(v) & 255u) << shift;
-      }
-      dst[i] = out;
-    }
+    composite_row(src + row, every_pixel ? nullptr : mask + row, dst + row, sums, span_start, spans,
+                  xscale);
   }
 }
 

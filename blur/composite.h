@@ -5,6 +5,14 @@
 
 #include <cstdint>
 
+// Tells GCC that a loop carries no dependence between iterations, so that it vectorises it
+// without a runtime overlap check that would send in-place calls down the scalar path.
+#if defined(__GNUC__) && !defined(__clang__)
+#define PFX_NO_ALIAS_LOOP _Pragma("GCC ivdep")
+#else
+#define PFX_NO_ALIAS_LOOP
+#endif
+
 namespace pfx {
 
 // Ratio of working to full size with 15 fraction bits.
@@ -33,6 +41,26 @@ constexpr int32_t bilinear(int32_t p00, int32_t p01, int32_t p10, int32_t p11, i
   const int32_t bottom = p11 * wx + p10 * (32 - wx);
   return (bottom * wy + top * (32 - wy)) >> 10;
 }
+
+// Upscaling a row by spans. The expanded bilinear sum p00 (32-wx)(32-wy) + p01 wx (32-wy) +
+// p10 (32-wx) wy + p11 wx wy has no intermediate rounding, so it may be summed down the working
+// columns first (once per row and working column) and across them second (once per pixel).
+//
+// One working column's contribution to a full-size row: the two samples the row lies between,
+// each weighted by the row's fraction. A sample outside the blurred area adds its weight to
+// `own` instead, to be filled with the pixel's own colour.
+struct ColumnSum {
+  int32_t r, g, b, own;
+};
+
+// The column sums of the row at py, for every working column; a null depth counts every
+// sample as inside.
+void column_sums(const uint8_t* blur, const uint8_t* depth, int32_t sw, WorkingPos py,
+                 ColumnSum* sums);
+
+// The full-size columns that lie between working columns j and j + 1 (where only the column
+// fraction changes) run from span_start[j] to span_start[j + 1]; span_start holds sw entries.
+void working_spans(int32_t width, int32_t sw, int32_t xscale, int32_t* span_start);
 
 // Composites a blurred sw x sh working image into dst (which may be src). Pixels are
 // recomputed when every_pixel is set or their mask byte is nonzero (mask may be null when

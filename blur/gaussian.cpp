@@ -8,6 +8,7 @@
 
 #include <cstddef>
 
+#include "frame/dispatch.h"
 #include "frame/frame.h"
 #include "photofx.h"
 
@@ -29,60 +30,145 @@ constexpr Window window_for(int32_t level) {
   return {-static_cast<int32_t>((l + 1) / 2), static_cast<int32_t>(l / 2)};
 }
 
-// One pass along lines of `count` samples, `stride` samples apart, centred on the sample at
-// `centre`; `pos` is the centre's place along the line and `len` the line's length. Writes the
-// three channels of the result to out.
-inline void blur_tap_line(const uint8_t* in, const uint8_t* depth, size_t centre, int32_t pos,
-                          int32_t len, ptrdiff_t stride, Window win, uint8_t* out) {
-  int32_t sum[3] = {0, 0, 0};
-  int32_t weight = 0;
-  const uint8_t* c = in + 3 * centre;
-  for (int32_t o = win.lo; o <= win.hi; ++o) {
-    if (pos + o < 0 || pos + o >= len) continue;
-    const ptrdiff_t t = static_cast<ptrdiff_t>(centre) + stride * o;
-    if (depth == nullptr || depth[t] == 1) {
-      const int32_t k = kBlurKernel[o < 0 ? -o : o];
-      const uint8_t* p = in + 3 * t;
-      for (int ch = 0; ch < 3; ++ch) sum[ch] += k * p[ch];
-      weight += k;
-    } else {
-      for (int ch = 0; ch < 3; ++ch) sum[ch] += 9 * c[ch];
-      weight += 9;
+constexpr int32_t kTaps = 9;
+
+// The nine taps of one line of outputs: for tap t, output x reads present[t][x] (1 where the tap
+// lies in the image), inside[t][x] (1 where it lies inside the area) and v[c][t][x]. A tap
+// outside the level's window, or beyond the edge, has kernel weight 0 and active 0, and so
+// contributes nothing however its bytes read.
+struct Taps {
+  const uint8_t* present[kTaps];
+  const uint8_t* inside[kTaps];
+  const uint8_t* v[3][kTaps];
+  uint16_t k[kTaps];
+  uint16_t active[kTaps];
+};
+
+// Blurs one line: each tap inside the area adds its kernel weight times its channels, each
+// other tap in the window stands for the centre sample with weight 9, so the weight is 9..81
+// and the result the sum over the weight. All nine taps are summed in registers, and the loop
+// vectorises across the line (the outputs are __restrict, so they cannot move the inputs).
+PFX_VECTOR_CLONES void blur_line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
+                                 const uint8_t* c2, uint8_t* __restrict o0, uint8_t* __restrict o1,
+                                 uint8_t* __restrict o2) {
+  const Taps t = taps;
+  for (int32_t x = 0; x < n; ++x) {
+    // Every sum fits 16 bits (channels at most 255 x 55, weights at most 55, counts at most
+    // 9), and 16-bit lanes hold twice as many outputs per vector.
+    uint16_t inside = 0, outside = 0, s0 = 0, s1 = 0, s2 = 0;
+    for (int32_t i = 0; i < kTaps; ++i) {
+      const uint16_t d = t.inside[i][x];
+      const uint16_t kd = static_cast<uint16_t>(t.k[i] * d);
+      inside = static_cast<uint16_t>(inside + kd);
+      outside = static_cast<uint16_t>(outside + t.active[i] * (t.present[i][x] - d));
+      s0 = static_cast<uint16_t>(s0 + kd * t.v[0][i][x]);
+      s1 = static_cast<uint16_t>(s1 + kd * t.v[1][i][x]);
+      s2 = static_cast<uint16_t>(s2 + kd * t.v[2][i][x]);
     }
+    const int32_t stand_in = 9 * outside;  // the sums and products below stay within 2^32
+    const uint32_t r = kBlurReciprocal[inside + stand_in];
+    o0[x] = static_cast<uint8_t>((static_cast<uint32_t>(s0 + stand_in * c0[x]) * r) >>
+                                 kBlurReciprocalShift);
+    o1[x] = static_cast<uint8_t>((static_cast<uint32_t>(s1 + stand_in * c1[x]) * r) >>
+                                 kBlurReciprocalShift);
+    o2[x] = static_cast<uint8_t>((static_cast<uint32_t>(s2 + stand_in * c2[x]) * r) >>
+                                 kBlurReciprocalShift);
   }
-  // The centre tap is always in range, so weight >= 3; sums stay below 255 * 55 * 1024.
-  for (int ch = 0; ch < 3; ++ch) {
-    const int32_t v = ((sum[ch] * 1024) / weight) >> 10;
-    out[ch] = static_cast<uint8_t>(v > 254 ? 255 : (v < 0 ? 0 : v));
+}
+
+// Splits a row of red, green, blue samples into three channel rows, and joins them back.
+PFX_VECTOR_CLONES void split_row(const uint8_t* rgb, int32_t n, uint8_t* __restrict r,
+                                 uint8_t* __restrict g, uint8_t* __restrict b) {
+  for (int32_t x = 0; x < n; ++x) {
+    r[x] = rgb[3 * x];
+    g[x] = rgb[3 * x + 1];
+    b[x] = rgb[3 * x + 2];
+  }
+}
+
+PFX_VECTOR_CLONES void join_row(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n,
+                                uint8_t* __restrict rgb) {
+  for (int32_t x = 0; x < n; ++x) {
+    rgb[3 * x] = r[x];
+    rgb[3 * x + 1] = g[x];
+    rgb[3 * x + 2] = b[x];
   }
 }
 
 }  // namespace
 
+// Both passes sum all nine taps of an output at once, across a whole line, with taps outside
+// the level's window weighted 0; the division by the weight is a multiplication by its
+// reciprocal. The horizontal pass leaves the image as three planes, so that the vertical pass
+// reads whole rows of one channel.
 bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32_t width,
                    int32_t height, int32_t level) {
   if (src == nullptr || dst == nullptr) return false;
   const int64_t n = pixel_count(width, height);
   if (n == 0 || n > kMaxPixels) return false;
-  auto* scratch = static_cast<uint8_t*>(fx_calloc(static_cast<uint32_t>(n * 3), 1));
-  if (scratch == nullptr) return false;
+  // One block: the three planes, a plane of inside flags, and five padded rows holding a source
+  // row's presence, inside flags and channels (the last three reused for a row of results).
+  constexpr int32_t kPad = 4;
+  const int64_t padded = int64_t{width} + 2 * kPad;
+  const int64_t bytes = 4 * n + 5 * padded;
+  if (bytes > int64_t{UINT32_MAX}) return false;
+  auto* block = static_cast<uint8_t*>(fx_malloc(static_cast<uint32_t>(bytes), 1));
+  if (block == nullptr) return false;
+  const size_t w = static_cast<size_t>(width), pw = static_cast<size_t>(padded);
+  const size_t samples = static_cast<size_t>(n);
+  uint8_t* plane[3] = {block, block + samples, block + 2 * samples};
+  uint8_t* flags = plane[2] + samples;
+  uint8_t* present = flags + samples;  // 1 inside the line, 0 in the padding
+  uint8_t* inside = present + pw;      // and each padded row likewise: 0 in the padding
+  uint8_t* value[3] = {inside + pw, inside + 2 * pw, inside + 3 * pw};
+  for (size_t i = 0; i < 5 * pw; ++i) present[i] = 0;
+  for (size_t x = 0; x < w; ++x) present[kPad + x] = 1;
+  for (size_t i = 0; i < samples; ++i) {
+    flags[i] = (depth == nullptr || depth[i] == 1) ? 1 : 0;
+  }
 
   const Window win = window_for(level);
-  const ptrdiff_t w = width;
-  // Horizontal pass reads only src, so dst may be src.
-  for (int32_t y = 0; y < height; ++y) {
-    for (int32_t x = 0; x < width; ++x) {
-      const size_t i = static_cast<size_t>(y) * static_cast<size_t>(width) + static_cast<size_t>(x);
-      blur_tap_line(src, depth, i, x, width, 1, win, scratch + 3 * i);
-    }
+  Taps taps{};
+  // Horizontal pass, into the planes; it reads only src, so dst may be src. Tap t of output x
+  // is padded sample x + t, that is offset t - 4.
+  for (int32_t i = 0; i < kTaps; ++i) {
+    const int32_t o = i - kPad;
+    const bool in_window = o >= win.lo && o <= win.hi;
+    taps.present[i] = present + i;
+    taps.inside[i] = inside + i;
+    for (int c = 0; c < 3; ++c) taps.v[c][i] = value[c] + i;
+    taps.k[i] = static_cast<uint16_t>(in_window ? kBlurKernel[o < 0 ? -o : o] : 0);
+    taps.active[i] = in_window ? 1 : 0;
   }
   for (int32_t y = 0; y < height; ++y) {
-    for (int32_t x = 0; x < width; ++x) {
-      const size_t i = static_cast<size_t>(y) * static_cast<size_t>(width) + static_cast<size_t>(x);
-      blur_tap_line(scratch, depth, i, y, height, w, win, dst + 3 * i);
-    }
+    const size_t row = static_cast<size_t>(y) * w;
+    const uint8_t* in = src + 3 * row;
+    for (size_t x = 0; x < w; ++x) inside[kPad + x] = flags[row + x];
+    split_row(in, width, value[0] + kPad, value[1] + kPad, value[2] + kPad);
+    blur_line(width, taps, value[0] + kPad, value[1] + kPad, value[2] + kPad, plane[0] + row,
+              plane[1] + row, plane[2] + row);
   }
-  fx_free(scratch);
+
+  // Vertical pass, from the planes into dst, a row of outputs at a time. Rows beyond the edge
+  // drop out whole; they are pointed at the centre row only to keep every read in bounds.
+  const uint8_t* every = present + kPad;
+  for (int32_t y = 0; y < height; ++y) {
+    for (int32_t i = 0; i < kTaps; ++i) {
+      const int32_t o = i - kPad;
+      const bool used = o >= win.lo && o <= win.hi && y + o >= 0 && y + o < height;
+      const size_t row = static_cast<size_t>(used ? y + o : y) * w;
+      taps.present[i] = every;
+      taps.inside[i] = flags + row;
+      for (int c = 0; c < 3; ++c) taps.v[c][i] = plane[c] + row;
+      taps.k[i] = static_cast<uint16_t>(used ? kBlurKernel[o < 0 ? -o : o] : 0);
+      taps.active[i] = used ? 1 : 0;
+    }
+    const size_t row = static_cast<size_t>(y) * w;
+    blur_line(width, taps, plane[0] + row, plane[1] + row, plane[2] + row, value[0], value[1],
+              value[2]);
+    join_row(value[0], value[1], value[2], width, dst + 3 * row);
+  }
+  fx_free(block);
   return true;
 }
 

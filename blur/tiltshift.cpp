@@ -13,6 +13,7 @@
 #include "blur/gaussian.h"
 #include "blur/lens.h"
 #include "blur/workspace.h"
+#include "frame/dispatch.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "photofx.h"
@@ -24,6 +25,36 @@ int32_t resize_ratio = 0;
 namespace pfx {
 namespace {
 
+// One row of the upscaled blur mixed with the source: weight w (0..256) of the source, the rest
+// of the blur. Spans and column sums as for the depth compositing, with no depth; the bilinear
+// value is at most 255 and the mix at most 255, so neither needs clamping.
+PFX_VECTOR_CLONES void restore_row(const uint32_t* src, uint32_t* dst, const ColumnSum* sums,
+                                   const int32_t* span_start, int32_t spans, int32_t xscale,
+                                   int32_t w) {
+  const int32_t blur_w = 256 - w;
+  for (int32_t j = 0; j < spans; ++j) {
+    const ColumnSum a = sums[j], b = sums[j + 1];
+    const int32_t r0 = a.r * 32, dr = b.r - a.r;
+    const int32_t g0 = a.g * 32, dg = b.g - a.g;
+    const int32_t b0 = a.b * 32, db = b.b - a.b;
+    const int32_t end = span_start[j + 1];
+    // Each pixel is read before it is written and no other is touched: safe when dst is src.
+    PFX_NO_ALIAS_LOOP
+    for (int32_t x = span_start[j]; x < end; ++x) {
+      const uint32_t s = src[x];
+      const int32_t wx = ((x * xscale) >> 10) & 31;  // the column's weight, as working_pos has it
+      const int32_t r =
+          (((r0 + dr * wx) >> 10) * blur_w + static_cast<int32_t>((s >> 16) & 255u) * w) >> 8;
+      const int32_t g =
+          (((g0 + dg * wx) >> 10) * blur_w + static_cast<int32_t>((s >> 8) & 255u) * w) >> 8;
+      const int32_t bl =
+          (((b0 + db * wx) >> 10) * blur_w + static_cast<int32_t>(s & 255u) * w) >> 8;
+      dst[x] = (s & 0xFF000000u) | (static_cast<uint32_t>(r) << 16) |
+               (static_cast<uint32_t>(g) << 8) | static_cast<uint32_t>(bl);
+    }
+  }
+}
+
 // Blurred working image, scaled up and mixed with the source by each row's sharpness weight.
 // Arguments are checked by the caller, including can_composite(sw, sh).
 void restore(const uint32_t* src, const uint8_t* blur, uint32_t* dst, int32_t width, int32_t height,
@@ -34,29 +65,13 @@ void restore(const uint32_t* src, const uint8_t* blur, uint32_t* dst, int32_t wi
   }
   const int32_t yscale = working_scale(sh, height);
   const int32_t xscale = working_scale(sw, width);
-  const size_t row_samples = static_cast<size_t>(sw);
+  int32_t span_start[kMaxWorkingSide];
+  ColumnSum sums[kMaxWorkingSide];
+  working_spans(width, sw, xscale, span_start);
   for (int32_t y = 0; y < height; ++y) {
-    const int32_t w = band.weight(y);
-    const WorkingPos py = working_pos(y, yscale, sh);
-    const uint8_t* top = blur + 3 * static_cast<size_t>(py.index) * row_samples;
-    const uint8_t* bottom = top + 3 * row_samples;
     const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
-    for (int32_t x = 0; x < width; ++x) {
-      const size_t i = row + static_cast<size_t>(x);
-      const uint32_t s = src[i];  // read once, before dst[i] is written: dst may be src
-      const WorkingPos px = working_pos(x, xscale, sw);
-      const size_t j = 3 * static_cast<size_t>(px.index);
-      uint32_t out = s & 0xFF000000u;
-      for (int32_t c = 0; c < 3; ++c) {
-        const int32_t shift = 16 - 8 * c;
-        const int32_t b = clamp_byte(bilinear(top[j + c], top[j + 3 + c], bottom[j + c],
-                                              bottom[j + 3 + c], px.frac, py.frac));
-        const int32_t own = static_cast<int32_t>((s >> shift) & 255u);
-        const int32_t v = clamp_byte((b * (256 - w) + own * w) >> 8);
-        out |= static_cast<uint32_t>(v) << shift;
-      }
-      dst[i] = out;
-    }
+    column_sums(blur, nullptr, sw, working_pos(y, yscale, sh), sums);
+    restore_row(src + row, dst + row, sums, span_start, sw - 1, xscale, band.weight(y));
   }
 }
 

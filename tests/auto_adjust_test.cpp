@@ -1,15 +1,17 @@
 // Auto adjust: the parameters and their ranges, the small-image path, tone curves on images built
 // so that each rule shows in the pixels (the weight picked by the bright share, the channel
 // limit, the cut-off), exact arithmetic on an image large enough to overflow 32 bits, in-place
-// use, refusals and allocation failures.
+// use, refusals, the memory the pass needs, its gain table and the plain reference form.
 #include <gtest/gtest.h>
 
 #include <cstdint>
 #include <utility>
 #include <vector>
 
+#include "auto/auto_adjust.h"
 #include "frame/alloc_hook.h"
 #include "photofx.h"
+#include "reference/auto_adjust.h"
 #include "support/images.h"
 
 namespace {
@@ -194,7 +196,7 @@ TEST(AutoAdjust, ParametersStoredOutOfRangeCountAsTheNearerEnd) {
   EXPECT_EQ(with(200, 101, 8197, 299), with(127, 100, 8196, 300));
 }
 
-TEST(AutoAdjust, RefusalsAndFailedAllocationsWriteNothing) {
+TEST(AutoAdjust, RefusalsWriteNothing) {
   const Pixels img = pfx::test::random_image(150, 150, 3);
   Pixels dst(img.size(), kUntouched);
   const Pixels untouched = dst;
@@ -209,18 +211,110 @@ TEST(AutoAdjust, RefusalsAndFailedAllocationsWriteNothing) {
   EXPECT_EQ(fx_process_hdr(img.data(), dst.data(), 65536, 65536), kBad);
   EXPECT_EQ(fx_process_hdr(img.data(), dst.data(), 100, INT32_MAX), kBad);
   EXPECT_EQ(dst, untouched);
+}
 
-  for (int64_t n = 1; n <= 2; ++n) {  // the luma plane, then the lightness plane
-    pfx::arm_allocation_failure(n);
-    EXPECT_EQ(fx_process_hdr(img.data(), dst.data(), 150, 150), PHOTOFX_OUT_OF_MEMORY) << n;
-    pfx::arm_allocation_failure(0);
-    EXPECT_EQ(dst, untouched) << n;
-  }
-  pfx::arm_allocation_failure(3);
-  EXPECT_EQ(applyAutoAdjust(img.data(), dst.data(), 150, 150), PHOTOFX_SUCCESS);
-  EXPECT_EQ(pfx::allocation_requests(), 2);
+// The pass keeps no planes: small images allocate nothing, large ones only the gain table, and
+// without that table they divide instead, with the same result. Out of memory cannot happen.
+TEST(AutoAdjust, NeedsNoMemoryItCannotDoWithout) {
+  const Pixels small = pfx::test::random_image(150, 150, 3);
+  pfx::arm_allocation_failure(1);
+  EXPECT_EQ(applyAutoAdjust(small.data(), Pixels(small.size()).data(), 150, 150), PHOTOFX_SUCCESS);
+  EXPECT_EQ(pfx::allocation_requests(), 0);
+
+  const Pixels large = pfx::test::random_image(512, 300, 4);
+  Pixels with_table(large.size(), kUntouched), without(large.size(), kUntouched);
+  pfx::arm_allocation_failure(2);
+  EXPECT_EQ(fx_process_hdr(large.data(), with_table.data(), 512, 300), PHOTOFX_SUCCESS);
+  EXPECT_EQ(pfx::allocation_requests(), 1);
+  pfx::arm_allocation_failure(1);
+  EXPECT_EQ(fx_process_hdr(large.data(), without.data(), 512, 300), PHOTOFX_SUCCESS);
   pfx::arm_allocation_failure(0);
-  EXPECT_EQ(dst, process(img, 150, 150));
+  EXPECT_EQ(without, with_table);
+  EXPECT_NE(with_table, large);
+}
+
+// The gain table holds new_luma / luma for every luma, whatever the curve: every new luma a curve
+// sample can give (a curve value of 0 to 200) is tried on every luma, and so are rising curves.
+TEST(AutoAdjustGain, TableMatchesDivisionForEveryNumeratorAndLuma) {
+  std::vector<uint32_t> gain(pfx::kLumas);
+  uint32_t new_luma[pfx::kCurveSamples];
+  auto check = [&](const char* what) {
+    pfx::build_gain_table(new_luma, gain.data());
+    for (uint32_t y = 0; y < pfx::kLumas; ++y) {
+      const uint32_t want = y < 1024 ? 1024u : new_luma[pfx::level_of(y) / 2] / y;
+      ASSERT_EQ(gain[y], want) << what << " luma " << y;
+    }
+  };
+  for (int64_t value = 0; value <= 200; ++value) {
+    const auto n = static_cast<uint32_t>(((16 * value * 65536) / 100) * 255);
+    for (uint32_t& v : new_luma) v = n;
+    check("flat");
+  }
+  pfx::test::Rng rng(12);
+  for (int rising = 0; rising < 8; ++rising) {
+    int64_t value = 0;
+    for (uint32_t& v : new_luma) {
+      value += rng.between(0, 8);
+      v = static_cast<uint32_t>(((16 * value * 65536) / 100) * 255);
+    }
+    check("rising");
+  }
+}
+
+// The rules behind the luma shortcuts: the lightness level of a luma is the level of the
+// twenty-bit luma, and the full-scale gain puts the strongest channel on 254.
+TEST(AutoAdjustGain, LevelsAndFullScaleGainsFollowTheirRules) {
+  for (uint32_t y = 0; y < pfx::kLumas; ++y) {
+    const int64_t y20 = int64_t{y} * 1024;
+    ASSERT_EQ(pfx::level_of(y), ((y20 / 255) * 100) >> 20) << y;
+  }
+  EXPECT_EQ(pfx::level_of(pfx::kLargestLuma), 100);
+  for (uint32_t c = 0; c < 256; ++c) {
+    ASSERT_EQ(pfx::kFullScaleGain[c], 0xFF00000u / (c * 1024 + 1)) << c;
+    if (c > 0) {
+      EXPECT_EQ((c * pfx::kFullScaleGain[c]) >> 10, 254u) << c;
+    }
+  }
+}
+
+// The fast passes against the plain two-pass form with its planes and per-pixel division: on
+// noise with random alpha, on images that hold every luma, at awkward sizes on both sides of the
+// table threshold, under extreme parameters, into a second buffer and in place.
+TEST(AutoAdjust, MatchesTheReferenceForm) {
+  // Every luma from dark to full, as grey-ish ramps plus channel noise.
+  auto ramps = [](int32_t w, int32_t h, uint64_t seed) {
+    pfx::test::Rng rng(seed);
+    Pixels img(static_cast<size_t>(w) * h);
+    for (size_t i = 0; i < img.size(); ++i) {
+      const uint32_t base = static_cast<uint32_t>(i * 256 / img.size());
+      const uint32_t r = base ^ (rng.word() & 7), g = base ^ (rng.word() & 3);
+      img[i] = argb(rng.word() >> 24, r, g, (i % 5 == 0) ? 255 : base ^ (rng.word() & 15));
+    }
+    return img;
+  };
+  struct Case {
+    int32_t w, h;
+    bool noise;
+    pfx::reference::AutoParams p;
+  };
+  const Case cases[] = {
+      {150, 150, true, {70, 100, 1000, 5120}}, {151, 157, false, {0, 100, 300, 300}},
+      {509, 257, true, {70, 100, 1000, 5120}}, {512, 300, false, {127, 100, 8196, 8196}},
+      {1021, 151, true, {50, 60, 300, 8196}},  {362, 361, false, {70, 0, 1000, 5120}},
+      {257, 509, false, {30, 1, 4000, 2000}},  {150, 871, true, {127, 37, 300, 300}},
+  };
+  for (const Case& c : cases) {
+    SavedParams saved;
+    fx_set_hdr(c.p.threshold, c.p.cutoff, c.p.weight1, c.p.weight2);
+    const Pixels img = c.noise ? pfx::test::random_image(c.w, c.h, uint64_t(c.w) * c.h)
+                               : ramps(c.w, c.h, uint64_t(c.w) + c.h);
+    Pixels want(img.size());
+    pfx::reference::auto_adjust(img.data(), want.data(), c.w, c.h, c.p);
+    EXPECT_EQ(process(img, c.w, c.h), want) << c.w << "x" << c.h;
+    Pixels in_place = img;
+    EXPECT_EQ(fx_process_hdr(in_place.data(), in_place.data(), c.w, c.h), PHOTOFX_SUCCESS);
+    EXPECT_EQ(in_place, want) << c.w << "x" << c.h << " in place";
+  }
 }
 
 }  // namespace

@@ -7,8 +7,10 @@
 #include <string>
 #include <vector>
 
+#include "blur/gaussian.h"
 #include "frame/alloc_hook.h"
 #include "photofx.h"
+#include "reference/blur.h"
 #include "support/images.h"
 
 namespace {
@@ -98,6 +100,37 @@ TEST(GaussianBlur, UniformStaysUniformWideLevelsAgreeAndBadCallsWriteNothing) {
   make_lens_blur(img.data(), dst.data(), nullptr, 13, 7, 4);
   make_lens_blur(img.data(), dst.data(), depth.data(), -13, 7, 4);
   EXPECT_EQ(dst, before);
+}
+
+// The line-at-a-time blur against the per-sample form: awkward sizes down to single rows and
+// columns, every level and some beyond, random depth (only 1 is inside) or none, into a second
+// buffer and in place. The reciprocal that replaces the division is checked on every sum of
+// every weight.
+TEST(GaussianBlur, MatchesTheReferenceForm) {
+  for (uint32_t weight = 1; weight < 82; ++weight) {
+    for (uint32_t sum = 0; sum <= 255 * weight; ++sum) {
+      ASSERT_EQ((sum * pfx::kBlurReciprocal[weight]) >> pfx::kBlurReciprocalShift, sum / weight)
+          << sum << " / " << weight;
+    }
+  }
+  const std::pair<int32_t, int32_t> sizes[] = {{1, 1},  {1, 13}, {13, 1},   {2, 3},
+                                               {17, 9}, {31, 5}, {250, 187}};
+  uint64_t seed = 40;
+  for (const auto& [w, h] : sizes) {
+    const size_t n = static_cast<size_t>(w) * h;
+    const Bytes img = random_bytes(3 * n, ++seed);
+    const pfx::test::Mask depth = pfx::test::random_mask(w, h, ++seed);
+    for (const uint8_t* d : {depth.data(), static_cast<const uint8_t*>(nullptr)}) {
+      for (int32_t level : {-1, 0, 1, 2, 3, 4, 5, 6, 7, 8, 9, INT32_MIN}) {
+        Bytes want(3 * n), got(3 * n), in_place = img;
+        pfx::reference::gaussian_blur(img.data(), want.data(), d, w, h, level);
+        ASSERT_TRUE(pfx::gaussian_blur(img.data(), got.data(), d, w, h, level));
+        ASSERT_TRUE(pfx::gaussian_blur(in_place.data(), in_place.data(), d, w, h, level));
+        EXPECT_EQ(got, want) << w << "x" << h << " level " << level << (d ? " depth" : "");
+        EXPECT_EQ(in_place, want) << w << "x" << h << " level " << level;
+      }
+    }
+  }
 }
 
 // Lens blur of a 5 x 5 black image with a white middle, all depth 1, drawn as '#' for white.

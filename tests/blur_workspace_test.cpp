@@ -6,9 +6,11 @@
 #include <cstdint>
 #include <vector>
 
+#include "blur/composite.h"
 #include "blur/workspace.h"
 #include "frame/alloc_hook.h"
 #include "photofx.h"
+#include "reference/blur.h"
 #include "support/images.h"
 
 namespace {
@@ -69,6 +71,39 @@ TEST(BlurReduction, ShiftAndScaleDown) {
   const Bytes before = depth;
   scale_down_depth(m.data(), 10, 12, depth.data(), 0, 2);
   EXPECT_EQ(depth, before);
+}
+
+// The span-wise compositing against the plain per-pixel form: awkward widths, working sizes
+// from the smallest to more samples than pixels, random depth (0 keeps the source colour) and
+// mask bytes, whole-image and masked, into a second buffer and in place.
+TEST(BlurComposite, MatchesTheReferenceForm) {
+  struct Case {
+    int32_t w, h, sw, sh;
+  };
+  const Case cases[] = {{1, 7, 2, 2},     {7, 1, 2, 2},    {2, 2, 2, 2},       {13, 11, 3, 5},
+                        {37, 29, 9, 7},   {101, 67, 6, 4}, {250, 190, 15, 11}, {33, 17, 40, 20},
+                        {1003, 5, 62, 2}, {9, 600, 2, 37}};
+  uint64_t seed = 100;
+  for (const Case& c : cases) {
+    const size_t n = static_cast<size_t>(c.w) * c.h, samples = static_cast<size_t>(c.sw) * c.sh;
+    const Pixels src = pfx::test::random_image(c.w, c.h, ++seed);
+    const Mask mask = pfx::test::random_mask(c.w, c.h, ++seed);
+    const Mask depth = pfx::test::random_mask(c.sw, c.sh, ++seed);
+    Bytes blur(3 * samples);
+    pfx::test::Rng rng(++seed);
+    for (uint8_t& b : blur) b = static_cast<uint8_t>(rng.word());
+    for (const bool every : {true, false}) {
+      Pixels want(n, kUntouched), got(n, kUntouched), in_place = src;
+      pfx::reference::composite(src.data(), blur.data(), mask.data(), depth.data(), want.data(),
+                                c.w, c.h, c.sw, c.sh, every);
+      pfx::composite(src.data(), blur.data(), mask.data(), depth.data(), got.data(), c.w, c.h, c.sw,
+                     c.sh, every);
+      pfx::composite(in_place.data(), blur.data(), mask.data(), depth.data(), in_place.data(), c.w,
+                     c.h, c.sw, c.sh, every);
+      EXPECT_EQ(got, want) << c.w << "x" << c.h << " from " << c.sw << "x" << c.sh << every;
+      EXPECT_EQ(in_place, want) << c.w << "x" << c.h << " from " << c.sw << "x" << c.sh << every;
+    }
+  }
 }
 
 // Compositing changes only pixels both selected and blurred (depth nonzero), and nothing for

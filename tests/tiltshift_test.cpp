@@ -10,6 +10,7 @@
 
 #include "frame/alloc_hook.h"
 #include "photofx.h"
+#include "reference/blur.h"
 #include "support/images.h"
 
 namespace {
@@ -83,6 +84,35 @@ TEST(TiltShiftRows, WeightFallsLinearlyFromTheBandAndShortFadesKeepTheSource) {
     EXPECT_EQ(row_weights(10, c, r), std::vector<int32_t>(10, 0)) << c << " " << r;
   }
   EXPECT_EQ(row_weights(10, INT32_MAX, INT32_MAX), std::vector<int32_t>(10, 256));
+}
+
+// The span-wise mix against the per-pixel form: awkward sizes and working sizes, bands at the
+// top, middle and bottom (so every row weight from 0 to 256 occurs), into a second buffer and in
+// place.
+TEST(TiltShiftRows, RestoreMatchesTheReferenceForm) {
+  struct Case {
+    int32_t w, h, sw, sh, centre, half;
+  };
+  const Case cases[] = {{1, 9, 2, 2, 4, 1},          {9, 1, 2, 2, 0, 0},
+                        {37, 29, 9, 7, 14, 3},       {101, 67, 6, 4, 0, 10},
+                        {250, 190, 15, 11, 189, 20}, {33, 17, 40, 20, 8, 2},
+                        {1003, 300, 62, 18, 150, 40}};
+  uint64_t seed = 300;
+  for (const Case& c : cases) {
+    const size_t n = static_cast<size_t>(c.w) * c.h;
+    const Pixels src = pfx::test::random_image(c.w, c.h, ++seed);
+    Bytes blur(3 * static_cast<size_t>(c.sw) * c.sh);
+    pfx::test::Rng rng(++seed);
+    for (uint8_t& b : blur) b = static_cast<uint8_t>(rng.word());
+    Pixels want(n, kUntouched), got(n, kUntouched), in_place = src;
+    pfx::reference::tilt_restore(src.data(), blur.data(), want.data(), c.w, c.h, c.sw, c.sh,
+                                 pfx::TiltBand(c.h, c.centre, c.half));
+    restore_tiltshift(src.data(), blur.data(), got.data(), c.w, c.h, c.sw, c.sh, c.centre, c.half);
+    restore_tiltshift(in_place.data(), blur.data(), in_place.data(), c.w, c.h, c.sw, c.sh, c.centre,
+                      c.half);
+    EXPECT_EQ(got, want) << c.w << "x" << c.h << " from " << c.sw << "x" << c.sh;
+    EXPECT_EQ(in_place, want) << c.w << "x" << c.h << " from " << c.sw << "x" << c.sh;
+  }
 }
 
 using TiltFn = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t, int32_t, int32_t);
