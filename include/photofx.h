@@ -630,8 +630,8 @@ PHOTOFX_API extern int32_t g_HDR_CutOff;    /* 0..100, initially 100: top of the
 PHOTOFX_API extern int32_t g_HDR_Weight1;   /* 300..8196, initially 1000: uniform weight */
 PHOTOFX_API extern int32_t g_HDR_Weight2;   /* 300..8196, initially 5120: the same, bright image */
 
-/* PHOTOFX_SUCCESS; PHOTOFX_OUT_OF_MEMORY with dst untouched; PHOTOFX_INVALID_ARGUMENT for a null
- * buffer or an image too large to address. dst may be src. */
+/* PHOTOFX_SUCCESS, or PHOTOFX_INVALID_ARGUMENT for a null buffer or an image too large to
+ * address. Needs no memory it cannot do without, so never PHOTOFX_OUT_OF_MEMORY. dst may be src. */
 PHOTOFX_API int32_t fx_process_hdr(const uint32_t* src, uint32_t* dst, int32_t width,
                                    int32_t height);
 PHOTOFX_API int32_t applyAutoAdjust(const uint32_t* src, uint32_t* dst, int32_t width,

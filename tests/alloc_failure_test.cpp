@@ -145,16 +145,18 @@ int32_t tilt(Buffers& b) {
 
 int32_t tilt_preview(Buffers& b) { return tilt<fx_tiltshift_preview>(b); }
 
-// Downlight whose auto-adjust pass got no memory: the rest of the chain still runs, as if that
-// pass had left its input alone.
-void downlight_without_auto_adjust(Buffers& b) {
-  const int32_t w = b.width, h = b.height;
-  uint32_t* d = b.dst.data();
-  fx_control_fadedcolor_all(b.src.data(), d, w, h, 50);
-  fx_control_contrast_all(d, d, w, h, 9);
-  fx_control_saturation_all(d, d, w, h, 7);
-  fx_adjust_RGB_all(d, d, w, h, 9, 9, 9);
-  fx_control_exposure_all(d, d, w, h, 13);
+// Auto adjust without memory for its gain table divides instead: the same pixels. So do the
+// downlight looks, which run it.
+template <auto Fn>
+void unarmed(Buffers& b) {
+  Fn(b.src.data(), b.dst.data(), b.width, b.height);
+}
+
+template <auto Fn>
+void unarmed_partial(Buffers& b) {
+  const pfx::Rect r = b.bounds;
+  Fn(b.src.data(), b.mask.data(), b.dst.data(), b.width, b.height, r.left, r.right, r.top,
+     r.bottom);
 }
 
 int32_t gaussian_of_work(Buffers& b) {
@@ -182,8 +184,8 @@ struct Case {
 
 void PrintTo(const Case& c, std::ostream* os) { *os << c.name; }
 
-// 500 x 60 and 30 x 500 photographs are blurred at half size; 150 x 150 is the smallest image
-// that auto adjust maps through its tone curve (smaller ones allocate nothing).
+// 500 x 60 and 30 x 500 photographs are blurred at half size; auto adjust takes a gain table
+// only from about 131,000 pixels up (below that it divides).
 // clang-format off
 const Case kCases[] = {
     // Depth-of-field blur.
@@ -237,14 +239,15 @@ const Case kCases[] = {
      .call = partial<fx_apply_yellowglow_partial>},
     {.name = "applyYellowglowPartial", .width = 23, .height = 17,
      .call = partial<applyYellowglowPartial>},
-    {.name = "fx_apply_downlight_partial_masked", .width = 150, .height = 150,
-     .call = partial<fx_apply_downlight_partial>, .degrades_from = 2},
-    {.name = "fx_apply_downlight_partial", .width = 150, .height = 150,
+    {.name = "fx_apply_downlight_partial_masked", .width = 512, .height = 300,
+     .call = partial<fx_apply_downlight_partial>, .degrades_from = 2,
+     .degraded = unarmed_partial<fx_apply_downlight_partial>},
+    {.name = "fx_apply_downlight_partial", .width = 512, .height = 300,
      .call = partial<fx_apply_downlight_partial>, .whole = true, .degrades_from = 2,
-     .degraded = downlight_without_auto_adjust},
-    {.name = "applyDownlightPartial", .width = 150, .height = 150,
+     .degraded = unarmed_partial<fx_apply_downlight_partial>},
+    {.name = "applyDownlightPartial", .width = 512, .height = 300,
      .call = partial<applyDownlightPartial>, .whole = true, .degrades_from = 2,
-     .degraded = downlight_without_auto_adjust},
+     .degraded = unarmed_partial<applyDownlightPartial>},
     // Film looks: vintage's preset compositing, and the two rows soft glow saves in place.
     {.name = "fx_apply_vintage_partial", .width = 23, .height = 17,
      .call = partial<fx_apply_vintage_partial>},
@@ -258,14 +261,14 @@ const Case kCases[] = {
     {.name = "applySoftglowPartial", .width = 23, .height = 17,
      .call = partial_in_place<applySoftglowPartial, 90>, .whole = true},
     // Auto adjust, and downlight, which runs it as its second pass.
-    {.name = "fx_process_hdr", .width = 150, .height = 150, .call = full<fx_process_hdr>,
-     .out_of_memory = PHOTOFX_OUT_OF_MEMORY},
-    {.name = "applyAutoAdjust", .width = 160, .height = 150, .call = full<applyAutoAdjust>,
-     .out_of_memory = PHOTOFX_OUT_OF_MEMORY},
-    {.name = "fx_apply_downlight", .width = 150, .height = 150, .call = full<fx_apply_downlight>,
-     .degrades_from = 1, .degraded = downlight_without_auto_adjust},
-    {.name = "applyDownlight", .width = 150, .height = 151, .call = full<applyDownlight>,
-     .degrades_from = 1, .degraded = downlight_without_auto_adjust},
+    {.name = "fx_process_hdr", .width = 512, .height = 300, .call = full<fx_process_hdr>,
+     .out_of_memory = PHOTOFX_SUCCESS, .degrades_from = 1, .degraded = unarmed<fx_process_hdr>},
+    {.name = "applyAutoAdjust", .width = 512, .height = 301, .call = full<applyAutoAdjust>,
+     .out_of_memory = PHOTOFX_SUCCESS, .degrades_from = 1, .degraded = unarmed<applyAutoAdjust>},
+    {.name = "fx_apply_downlight", .width = 512, .height = 300, .call = full<fx_apply_downlight>,
+     .degrades_from = 1, .degraded = unarmed<fx_apply_downlight>},
+    {.name = "applyDownlight", .width = 512, .height = 301, .call = full<applyDownlight>,
+     .degrades_from = 1, .degraded = unarmed<applyDownlight>},
 };
 // clang-format on
 
