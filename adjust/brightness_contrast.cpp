@@ -6,6 +6,7 @@
 #include <cstdint>
 
 #include "adjust/brightness_contrast.h"
+#include "adjust/channel_map.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "frame/table.h"
@@ -38,7 +39,7 @@ void fx_control_brightness(const uint32_t* src, const uint8_t* mask, uint32_t* d
 
 void fx_control_contrast_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                              int32_t level) {
-  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Contrast(level)));
+  pfx::for_each_pixel_by_channel(src, dst, width, height, pfx::Contrast(level));
 }
 
 void fx_control_contrast(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,

@@ -79,6 +79,14 @@ bool has_byte_permutes() {
 
 }  // namespace
 
+bool channel_map_is_fast() {
+#ifdef PFX_BYTE_PERMUTES
+  return has_byte_permutes();
+#else
+  return false;
+#endif
+}
+
 void map_channels(const ChannelMap& map, const uint32_t* src, uint32_t* dst, size_t n) {
 #ifdef PFX_BYTE_PERMUTES
   if (has_byte_permutes()) {

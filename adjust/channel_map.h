@@ -6,6 +6,7 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "frame/frame.h"
 #include "frame/pixel.h"
 
 namespace pfx {
@@ -37,5 +38,34 @@ struct ChannelMap {
 // permutes (AVX-512 VBMI) sixteen pixels are looked up at once, the three tables held in
 // registers; elsewhere, and for the last few pixels, one pixel at a time.
 void map_channels(const ChannelMap& map, const uint32_t* src, uint32_t* dst, size_t n);
+
+// True where map_channels looks sixteen pixels up at once. Three byte permutes a pixel then beat
+// working out a rule of a few multiplies and clamps per channel, which is what the per-pixel
+// frame does best everywhere else.
+bool channel_map_is_fast();
+
+// The full-variant frame for a rule on Rgb that treats each channel on its own (exposure, the
+// channel gains, levels): through a channel map where that is fast, else the rule per pixel.
+// The map holds the rule's own results, so both give the same pixels.
+template <class Rule>
+bool for_each_pixel_by_channel(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
+                               const Rule& rule) {
+  if (!channel_map_is_fast()) return for_each_pixel(src, dst, width, height, on_pixels(rule));
+  if (src == nullptr || dst == nullptr) return false;
+  const int64_t n = pixel_count(width, height);
+  if (n > kMaxPixels) return false;
+  const ChannelMap map(
+      [&](int32_t c) {
+        return rule(Rgb{c, 0, 0}).r;
+      },
+      [&](int32_t c) {
+        return rule(Rgb{0, c, 0}).g;
+      },
+      [&](int32_t c) {
+        return rule(Rgb{0, 0, c}).b;
+      });
+  map_channels(map, src, dst, static_cast<size_t>(n));
+  return true;
+}
 
 }  // namespace pfx

@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "adjust/channel_map.h"
 #include "adjust/exposure_hue.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
@@ -70,8 +71,7 @@ extern "C" {
 int32_t fx_control_exposure_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                 int32_t level) {
   if (src == nullptr || dst == nullptr) return PHOTOFX_INVALID_ARGUMENT;
-  return pfx::status(
-      pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Exposure(level))));
+  return pfx::status(pfx::for_each_pixel_by_channel(src, dst, width, height, pfx::Exposure(level)));
 }
 
 int32_t fx_control_exposure(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,

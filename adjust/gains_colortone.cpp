@@ -8,6 +8,7 @@
 // 0..360 with PHOTOFX_INVALID_ARGUMENT and then writes nothing.
 #include <cstdint>
 
+#include "adjust/channel_map.h"
 #include "adjust/gains_colortone.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
@@ -55,7 +56,7 @@ extern "C" {
 
 void fx_adjust_RGB_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                        int32_t red, int32_t green, int32_t blue) {
-  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Gains(red, green, blue)));
+  pfx::for_each_pixel_by_channel(src, dst, width, height, pfx::Gains(red, green, blue));
 }
 
 void fx_adjust_RGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,

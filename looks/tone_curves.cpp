@@ -41,9 +41,10 @@ auto selected_channels_arithmetic(int32_t channel, Curve curve) {
 }
 
 // Levels within 0 <= low < high <= 255, the range the looks use, keep every product within 32
-// bits and take the arithmetic form; other levels take the table, made in 64 bits.
-constexpr bool levels_in_byte_range(int32_t low, int32_t high) {
-  return low >= 0 && low < high && high <= 255;
+// bits and take the arithmetic form, unless the table form is the faster one on this CPU; other
+// levels take the table, made in 64 bits.
+bool levels_by_arithmetic(int32_t low, int32_t high) {
+  return low >= 0 && low < high && high <= 255 && !channel_map_is_fast();
 }
 
 // The full-variant frame for the table form.
@@ -85,7 +86,7 @@ void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, i
                             int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;  // no range to stretch; dst is left as it was
   const int64_t scale = 261120 / (int64_t{high} - low);
-  if (pfx::levels_in_byte_range(low, high)) {
+  if (pfx::levels_by_arithmetic(low, high)) {
     const int32_t s32 = static_cast<int32_t>(scale);
     pfx::for_each_pixel(src, dst, width, height,
                         pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
@@ -103,7 +104,7 @@ void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, 
                              int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;
   const int64_t scale = (int64_t{high} - low) * 1024 / 255;
-  if (pfx::levels_in_byte_range(low, high)) {
+  if (pfx::levels_by_arithmetic(low, high)) {
     const int32_t s32 = static_cast<int32_t>(scale);
     pfx::for_each_pixel(src, dst, width, height,
                         pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
