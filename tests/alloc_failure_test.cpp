@@ -18,15 +18,17 @@
 #include "frame/alloc_hook.h"
 #include "frame/frame.h"
 #include "photofx.h"
+#include "support/calls.h"
 #include "support/images.h"
 
 namespace {
 
+using pfx::test::code_of;
+using pfx::test::kNoCode;
 using pfx::test::Mask;
 using pfx::test::Pixels;
 using Bytes = std::vector<uint8_t>;
 
-constexpr int32_t kNoCode = -1;  // what a call that returns nothing reports
 constexpr uint32_t kUntouched = 0xA5A5A5A5u;
 constexpr uint8_t kUntouchedByte = 0x5A;
 
@@ -66,16 +68,6 @@ struct Globals {
   }
   bool operator==(const Globals&) const = default;
 };
-
-template <class Call>
-int32_t code_of(Call&& call) {
-  if constexpr (std::is_void_v<std::invoke_result_t<Call>>) {
-    call();
-    return kNoCode;
-  } else {
-    return call();
-  }
-}
 
 // Adapters from the common argument shapes to a call on Buffers.
 template <auto Fn>

@@ -10,27 +10,19 @@
 
 #include "frame/frame.h"
 #include "photofx.h"
+#include "support/calls.h"
 #include "support/images.h"
 
 namespace {
 
 using pfx::Rect;
+using pfx::test::code_of;
+using pfx::test::kNoCode;
 using pfx::test::Mask;
 using pfx::test::Pixels;
 
-constexpr int32_t kNoCode = -1;  // what a call that returns nothing reports
 constexpr uint32_t kUntouched = 0xA5A5A5A5u;
 constexpr int32_t kW = 23, kH = 17;
-
-template <class Call>
-int32_t code_of(Call&& call) {
-  if constexpr (std::is_void_v<std::invoke_result_t<Call>>) {
-    call();
-    return kNoCode;
-  } else {
-    return call();
-  }
-}
 
 using FullFn = int32_t (*)(const uint32_t*, uint32_t*, int32_t, int32_t);
 using PartialFn = int32_t (*)(const uint32_t*, const uint8_t*, uint32_t*, int32_t, int32_t, Rect);
