@@ -40,7 +40,7 @@ inline Hsv rgb_to_hsv(int32_t r, int32_t g, int32_t b) {
   return {fixtoi(hf), s, mx};
 }
 
-// Any arguments are accepted; the products wrap like the 32-bit words they are specified as, so
+// Any arguments are accepted; the products wrap like the 32-bit words they are defined as, so
 // out-of-range saturation or value give garbage colours but never undefined behaviour. Hues
 // outside 0..360, and negative hues with s != 0, give black.
 inline Rgb hsv_to_rgb(int32_t h, int32_t s, int32_t v) {

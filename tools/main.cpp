@@ -182,13 +182,14 @@ std::string make_directory(const std::string& dir) {
 
 // Reads one input, applies the effect and writes the output. Returns the reason for failure,
 // naming the file it concerns.
-std::string apply_one(const Effect& effect, const Settings& settings, const SelectionSpec& spec,
-                      const std::string& in_path, const std::string& out_path) {
+std::string apply_one(const Effect& effect, const Settings& settings,
+                      const SelectionOptions& request, const std::string& in_path,
+                      const std::string& out_path) {
   Image in;
   if (std::string err = read_image(in_path, in); !err.empty()) return in_path + ": " + err;
   Selection selection;
-  if (spec.any()) {
-    if (std::string err = make_selection(spec, in.width, in.height, selection); !err.empty()) {
+  if (request.any()) {
+    if (std::string err = make_selection(request, in.width, in.height, selection); !err.empty()) {
       return in_path + ": " + err;
     }
   }
@@ -197,7 +198,7 @@ std::string apply_one(const Effect& effect, const Settings& settings, const Sele
     return in_path + ": " + err;
   }
   Image out;
-  if (std::string err = run_effect(effect, values, in, spec.any() ? &selection : nullptr, out);
+  if (std::string err = run_effect(effect, values, in, request.any() ? &selection : nullptr, out);
       !err.empty()) {
     return in_path + ": " + effect.name + ": " + err;
   }
@@ -217,7 +218,7 @@ int apply(ArgReader& args) {
     return usage_error("unknown effect '" + name + "' (photofx list shows them)");
 
   Settings settings;
-  SelectionSpec spec;
+  SelectionOptions request;
   std::string out_dir;
   bool force_progress = false, options_done = false;
   std::vector<std::string> files;
@@ -241,17 +242,17 @@ int apply(ArgReader& args) {
     if (!args.value_of(opt)) return usage_error("--" + opt.name + " needs a value");
     std::string err;
     if (opt.name == "mask") {
-      if (spec.has_mask) return usage_error("--mask is given twice");
-      spec.has_mask = true;
-      spec.mask_path = opt.value;
+      if (request.has_mask) return usage_error("--mask is given twice");
+      request.has_mask = true;
+      request.mask_path = opt.value;
     } else if (opt.name == "rect") {
-      if (spec.has_rect) return usage_error("--rect is given twice");
-      spec.has_rect = true;
-      err = parse_rect(opt.value, spec.rect);
+      if (request.has_rect) return usage_error("--rect is given twice");
+      request.has_rect = true;
+      err = parse_rect(opt.value, request.rect);
     } else if (opt.name == "ellipse") {
-      if (spec.has_ellipse) return usage_error("--ellipse is given twice");
-      spec.has_ellipse = true;
-      err = parse_ellipse(opt.value, spec.ellipse);
+      if (request.has_ellipse) return usage_error("--ellipse is given twice");
+      request.has_ellipse = true;
+      err = parse_ellipse(opt.value, request.ellipse);
     } else if (opt.name == "out-dir") {
       if (!out_dir.empty()) return usage_error("--out-dir is given twice");
       out_dir = opt.value;
@@ -262,7 +263,7 @@ int apply(ArgReader& args) {
     if (!err.empty()) return usage_error(err);
   }
 
-  if (spec.any() && effect->selects == Selects::kNothing) {
+  if (request.any() && effect->selects == Selects::kNothing) {
     return usage_error(std::string(effect->name) +
                        " takes no selection (it changes the image's size)");
   }
@@ -289,9 +290,9 @@ int apply(ArgReader& args) {
   }
   const bool progress = force_progress || (!out_dir.empty() && isatty(STDERR_FILENO) != 0);
 
-  if (spec.has_mask) {
-    if (std::string err = read_image(spec.mask_path, spec.mask_image); !err.empty()) {
-      say(spec.mask_path + ": " + err);
+  if (request.has_mask) {
+    if (std::string err = read_image(request.mask_path, request.mask_image); !err.empty()) {
+      say(request.mask_path + ": " + err);
       return kFailed;
     }
   }
@@ -308,7 +309,7 @@ int apply(ArgReader& args) {
       std::fprintf(stderr, "photofx: [%zu/%zu] %s -> %s\n", i + 1, jobs.size(),
                    jobs[i].first.c_str(), jobs[i].second.c_str());
     }
-    if (std::string err = apply_one(*effect, settings, spec, jobs[i].first, jobs[i].second);
+    if (std::string err = apply_one(*effect, settings, request, jobs[i].first, jobs[i].second);
         !err.empty()) {
       say(err);
       status = kFailed;

@@ -63,22 +63,22 @@ bool mask_selects(uint32_t pixel) {
   return grey * (pixel >> 24) >= kMaskThreshold * 255;
 }
 
-std::string make_selection(const SelectionSpec& spec, int32_t width, int32_t height,
+std::string make_selection(const SelectionOptions& request, int32_t width, int32_t height,
                            Selection& out) {
   const size_t w = static_cast<size_t>(width);
   out.mask.assign(w * static_cast<size_t>(height), 1);
 
-  if (spec.has_mask) {
-    const Image& m = spec.mask_image;
+  if (request.has_mask) {
+    const Image& m = request.mask_image;
     if (m.width != width || m.height != height) {
-      return "the mask " + spec.mask_path + " is " + image_size(m.width, m.height) +
+      return "the mask " + request.mask_path + " is " + image_size(m.width, m.height) +
              " but the image is " + image_size(width, height);
     }
     for (size_t i = 0; i < out.mask.size(); ++i) out.mask[i] = mask_selects(m.pixels[i]) ? 1 : 0;
   }
 
-  if (spec.has_rect) {
-    const Shape& s = spec.rect;
+  if (request.has_rect) {
+    const Shape& s = request.rect;
     const int64_t x0 = s.a, y0 = s.b, x1 = int64_t{s.a} + s.c - 1, y1 = int64_t{s.b} + s.d - 1;
     if (x1 < 0 || y1 < 0 || x0 >= width || y0 >= height) {
       return shape_text("--rect", s) + " lies outside the " + image_size(width, height) + " image";
@@ -90,8 +90,8 @@ std::string make_selection(const SelectionSpec& spec, int32_t width, int32_t hei
     }
   }
 
-  if (spec.has_ellipse) {
-    const Shape& s = spec.ellipse;
+  if (request.has_ellipse) {
+    const Shape& s = request.ellipse;
     const int64_t rx = s.c, ry = s.d;
     if (int64_t{s.a} + rx < 0 || int64_t{s.b} + ry < 0 || int64_t{s.a} - rx >= width ||
         int64_t{s.b} - ry >= height) {

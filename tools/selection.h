@@ -18,7 +18,7 @@ struct Shape {
   int32_t a = 0, b = 0, c = 0, d = 0;
 };
 
-struct SelectionSpec {
+struct SelectionOptions {
   bool has_mask = false, has_rect = false, has_ellipse = false;
   std::string mask_path;
   Image mask_image;  // the mask file, decoded once for all inputs
@@ -44,7 +44,7 @@ struct Selection {
 
 // The selection for an image of this size. Refuses a mask file of another size and a rectangle
 // or ellipse that lies wholly outside the image.
-std::string make_selection(const SelectionSpec& spec, int32_t width, int32_t height,
+std::string make_selection(const SelectionOptions& request, int32_t width, int32_t height,
                            Selection& out);
 
 // Runs `effect` on `in` into `out`, confined to `selection` (null: the whole image).
