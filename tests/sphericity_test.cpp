@@ -117,22 +117,6 @@ TEST(Sphericity, WindowAndFastModeStayInsideTheWindowClippedToTheImage) {
   EXPECT_EQ(edge.px[9 * 7 - 1] >> 24, 0xFFu);
 }
 
-// One row whose pixels name their distance from column c: red counts blocks of 256 columns,
-// green runs up and down within them (a triangle wave), so a blend of two neighbouring pixels
-// still names one of the two, and a sampled pixel tells how far out the warp read it.
-Pixels distance_code(int32_t w, int32_t c) {
-  Pixels px(static_cast<size_t>(w));
-  for (int32_t x = 0; x < w; ++x) {
-    const int32_t d = std::abs(x - c), block = d >> 8, within = d & 255;
-    px[static_cast<size_t>(x)] = pfx::test::argb(0, block, block % 2 ? 255 - within : within, 0);
-  }
-  return px;
-}
-int32_t distance_named(uint32_t p) {
-  const int32_t block = static_cast<int32_t>(p >> 16 & 255), g = static_cast<int32_t>(p >> 8 & 255);
-  return block * 256 + (block % 2 ? 255 - g : g);
-}
-
 TEST(Sphericity, FarFromTheOriginTheWarpMovesWithItsCentre) {
   // At x = 11000, x * 2^18 and cx * k pass 2^31; 1000 columns in, nothing comes near it. The
   // same circle must give the same pixels in both places.
@@ -157,7 +141,7 @@ TEST(Sphericity, WidePinchAndBulgeSampleBetweenTheLimitsOfTheirPull) {
   // radius; k * dx of the pinch passes it only where the pull stays strong far out, which
   // radius 25000 gives (its squared rim exceeds 2^30, so the falloff index stays 0).
   const int32_t w = 70001, cx = 35000;
-  const Pixels src = distance_code(w, cx);
+  const Pixels src = pfx::test::distance_code(w, cx);
   for (int32_t radius : {4500, 25000}) {
     const int64_t rim = (int64_t{radius} * radius * 500 + 128) >> 8;
     for (int32_t level : {-100, 100}) {
@@ -165,7 +149,7 @@ TEST(Sphericity, WidePinchAndBulgeSampleBetweenTheLimitsOfTheirPull) {
       ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
       for (int32_t x = 0; x < w; ++x) {
         const int32_t d = std::abs(x - cx);
-        const int32_t from = distance_named(r.px[static_cast<size_t>(x)]);
+        const int32_t from = pfx::test::distance_named(r.px[static_cast<size_t>(x)]);
         if (int64_t{d} * d > rim) {
           ASSERT_EQ(from, d) << x;
         } else if (level < 0) {

@@ -147,21 +147,6 @@ TEST(Twirl, FastModeFillsBlocksInsideTheClippedWindowOnly) {
   EXPECT_EQ(wide.px[static_cast<size_t>(h * w - 1)] >> 24, 0xFFu);
 }
 
-// One row whose pixels name their distance from column c: red counts blocks of 256 columns,
-// green runs up and down within them, so a blend of two neighbours still names one of them.
-Pixels distance_code(int32_t w, int32_t c) {
-  Pixels px(static_cast<size_t>(w));
-  for (int32_t x = 0; x < w; ++x) {
-    const int32_t d = std::abs(x - c), block = d >> 8, within = d & 255;
-    px[static_cast<size_t>(x)] = pfx::test::argb(0, block, block % 2 ? 255 - within : within, 0);
-  }
-  return px;
-}
-int32_t distance_named(uint32_t p) {
-  const int32_t block = static_cast<int32_t>(p >> 16 & 255), g = static_cast<int32_t>(p >> 8 & 255);
-  return block * 256 + (block % 2 ? 255 - g : g);
-}
-
 TEST(Twirl, LargeRadiiKeepEachPixelAtItsDistanceNearTheRim) {
   // Radius 5000 makes radius * rho pass 2^31 beyond about 4100 pixels out; radius 40000 is far
   // past where the 30-bit reciprocal of radius^2 would be 0. Near the rim the twist is small,
@@ -169,13 +154,13 @@ TEST(Twirl, LargeRadiiKeepEachPixelAtItsDistanceNearTheRim) {
   // distance's bytes adds at most half a pixel.
   for (int32_t radius : {5000, 40000}) {
     const int32_t c = radius, w = 2 * radius + 1;
-    const Warped r = twirl(distance_code(w, c), w, 1, c, 0, radius, 90);
+    const Warped r = twirl(pfx::test::distance_code(w, c), w, 1, c, 0, radius, 90);
     ASSERT_EQ(r.code, PHOTOFX_SUCCESS);
     for (int32_t x = 0; x < w; ++x) {
       const int32_t d = std::abs(x - c);
       if (d < radius * 85 / 100) continue;
       // The twist is at most 90 * (1 - 0.85) = 13.5 degrees: |sin| >= 0.97.
-      const int32_t got = distance_named(r.px[static_cast<size_t>(x)]);
+      const int32_t got = pfx::test::distance_named(r.px[static_cast<size_t>(x)]);
       ASSERT_LE(got, d + 1) << radius << " " << x;
       ASSERT_GE(got, d * 97 / 100 - 1) << radius << " " << x;
     }
