@@ -23,21 +23,6 @@ void partial_level(FuzzedDataProvider& in) {
 }
 
 template <auto Fn>
-void full_plain(FuzzedDataProvider& in) {
-  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider&) {
-    Fn(s, d, z.width, z.height);
-  });
-}
-
-template <auto Fn>
-void partial_plain(FuzzedDataProvider& in) {
-  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
-                         FuzzedDataProvider&) {
-    Fn(s, m, d, z.width, z.height, b.left, b.right, b.top, b.bottom);
-  });
-}
-
-template <auto Fn>
 void full_gains(FuzzedDataProvider& in) {
   full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
     Fn(s, d, z.width, z.height, pick_level(p), pick_level(p), pick_level(p));

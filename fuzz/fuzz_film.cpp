@@ -8,21 +8,6 @@ namespace {
 using namespace pfx::fuzz;
 using pfx::Rect;
 
-template <auto Fn>
-void full_plain(FuzzedDataProvider& in) {
-  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider&) {
-    Fn(s, d, z.width, z.height);
-  });
-}
-
-template <auto Fn>
-void partial_plain(FuzzedDataProvider& in) {
-  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
-                         FuzzedDataProvider&) {
-    Fn(s, m, d, z.width, z.height, b.left, b.right, b.top, b.bottom);
-  });
-}
-
 // A gamma from the fuzzer's bytes: any double, NaN and infinities included, or a usual value.
 double pick_gamma(FuzzedDataProvider& in) {
   if (in.ConsumeBool()) return in.ConsumeFloatingPoint<double>();

@@ -227,4 +227,20 @@ void partial_variant(FuzzedDataProvider& in, Call call) {
   }
 }
 
+// The two shapes most functions take: (src, dst, w, h) and (src, mask, dst, w, h, bounds).
+template <auto Fn>
+void full_plain(FuzzedDataProvider& in) {
+  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider&) {
+    Fn(s, d, z.width, z.height);
+  });
+}
+
+template <auto Fn>
+void partial_plain(FuzzedDataProvider& in) {
+  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
+                         FuzzedDataProvider&) {
+    Fn(s, m, d, z.width, z.height, b.left, b.right, b.top, b.bottom);
+  });
+}
+
 }  // namespace pfx::fuzz
