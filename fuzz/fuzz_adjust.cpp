@@ -8,21 +8,6 @@ using namespace pfx::fuzz;
 using pfx::Rect;
 
 template <auto Fn>
-void full_level(FuzzedDataProvider& in) {
-  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
-    Fn(s, d, z.width, z.height, pick_level(p));
-  });
-}
-
-template <auto Fn>
-void partial_level(FuzzedDataProvider& in) {
-  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
-                         FuzzedDataProvider& p) {
-    Fn(s, m, d, z.width, z.height, pick_level(p), b.left, b.right, b.top, b.bottom);
-  });
-}
-
-template <auto Fn>
 void full_gains(FuzzedDataProvider& in) {
   full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
     Fn(s, d, z.width, z.height, pick_level(p), pick_level(p), pick_level(p));

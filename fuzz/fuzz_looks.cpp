@@ -7,20 +7,6 @@ namespace {
 using namespace pfx::fuzz;
 using pfx::Rect;
 
-void greyscale(FuzzedDataProvider& in) {
-  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
-    controlGreyscale(s, d, z.width, z.height, pick_level(p));
-  });
-}
-
-void greyscale_partial(FuzzedDataProvider& in) {
-  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
-                         FuzzedDataProvider& p) {
-    controlGreyscalePartial(s, m, d, z.width, z.height, pick_level(p), b.left, b.right, b.top,
-                            b.bottom);
-  });
-}
-
 void sepia(FuzzedDataProvider& in) {
   full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider&) {
     const bool refused = !s || !d || too_large(z);
@@ -49,28 +35,14 @@ void curves(FuzzedDataProvider& in) {
   }
 }
 
-void greyscale_impl(FuzzedDataProvider& in) {
-  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
-    fx_control_greyscale_all(s, d, z.width, z.height, pick_level(p));
-  });
-}
-
-void greyscale_impl_partial(FuzzedDataProvider& in) {
-  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
-                         FuzzedDataProvider& p) {
-    fx_control_greyscale(s, m, d, z.width, z.height, pick_level(p), b.left, b.right, b.top,
-                         b.bottom);
-  });
-}
-
 const Op kOps[] = {
-    {"greyscale", greyscale},
-    {"greyscale partial", greyscale_partial},
+    {"greyscale", full_level<controlGreyscale>},
+    {"greyscale partial", partial_level<controlGreyscalePartial>},
     {"sepia", sepia},
     {"sepia partial", sepia_partial},
     {"curves", curves},
-    {"fx greyscale", greyscale_impl},
-    {"fx greyscale partial", greyscale_impl_partial},
+    {"fx greyscale", full_level<fx_control_greyscale_all>},
+    {"fx greyscale partial", partial_level<fx_control_greyscale>},
 };
 
 }  // namespace

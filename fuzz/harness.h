@@ -227,7 +227,23 @@ void partial_variant(FuzzedDataProvider& in, Call call) {
   }
 }
 
-// The two shapes most functions take: (src, dst, w, h) and (src, mask, dst, w, h, bounds).
+// The shapes most functions take: (src, dst, w, h) and (src, mask, dst, w, h, bounds), with
+// or without one level after the size.
+template <auto Fn>
+void full_level(FuzzedDataProvider& in) {
+  full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider& p) {
+    Fn(s, d, z.width, z.height, pick_level(p));
+  });
+}
+
+template <auto Fn>
+void partial_level(FuzzedDataProvider& in) {
+  partial_variant(in, [](const uint32_t* s, const uint8_t* m, uint32_t* d, Size z, Rect b,
+                         FuzzedDataProvider& p) {
+    Fn(s, m, d, z.width, z.height, pick_level(p), b.left, b.right, b.top, b.bottom);
+  });
+}
+
 template <auto Fn>
 void full_plain(FuzzedDataProvider& in) {
   full_variant(in, [](const uint32_t* s, uint32_t* d, Size z, FuzzedDataProvider&) {
