@@ -25,18 +25,6 @@ void digest_look(Digest& d, Full full, Partial partial) {
       });
 }
 
-TEST(Conformance, Retro) {
-  Digest d;
-  digest_look(d, fx_apply_retro, fx_apply_retro_partial);
-  EXPECT_GOLDEN("retro", d, 0x6124eec98cf0831eull);
-}
-
-TEST(Conformance, Sunshine) {
-  Digest d;
-  digest_look(d, fx_apply_sunshine, fx_apply_sunshine_partial);
-  EXPECT_GOLDEN("sunshine", d, 0x5f761acdc41e0045ull);
-}
-
 TEST(Conformance, Downlight) {
   Digest d;
   digest_look(d, fx_apply_downlight, fx_apply_downlight_partial);
@@ -53,22 +41,25 @@ TEST(Conformance, Downlight) {
   EXPECT_GOLDEN("downlight", d, 0x7f5cd50e8a596f65ull);
 }
 
-TEST(Conformance, Bluewash) {
-  Digest d;
-  digest_look(d, fx_apply_bluewash, fx_apply_bluewash_partial);
-  EXPECT_GOLDEN("bluewash", d, 0x2175c630b545c177ull);
-}
-
-TEST(Conformance, Nostalgia) {
-  Digest d;
-  digest_look(d, fx_apply_nostalgia, fx_apply_nostalgia_partial);
-  EXPECT_GOLDEN("nostalgia", d, 0x6edac32d7df23ef1ull);
-}
-
-TEST(Conformance, Yellowglow) {
-  Digest d;
-  digest_look(d, fx_apply_yellowglow, fx_apply_yellowglow_partial);
-  EXPECT_GOLDEN("yellowglow", d, 0xcb7eb9582c3b93c6ull);
+// The five looks without module state, each over every variant and bounds mode.
+TEST(Conformance, LooksWithoutAutoAdjust) {
+  const struct {
+    const char* name;
+    Full full;
+    Partial partial;
+    uint64_t golden;
+  } looks[] = {
+      {"retro", fx_apply_retro, fx_apply_retro_partial, 0x6124eec98cf0831eull},
+      {"sunshine", fx_apply_sunshine, fx_apply_sunshine_partial, 0x5f761acdc41e0045ull},
+      {"bluewash", fx_apply_bluewash, fx_apply_bluewash_partial, 0x2175c630b545c177ull},
+      {"nostalgia", fx_apply_nostalgia, fx_apply_nostalgia_partial, 0x6edac32d7df23ef1ull},
+      {"yellowglow", fx_apply_yellowglow, fx_apply_yellowglow_partial, 0xcb7eb9582c3b93c6ull},
+  };
+  for (const auto& look : looks) {
+    Digest d;
+    digest_look(d, look.full, look.partial);
+    EXPECT_GOLDEN(look.name, d, look.golden);
+  }
 }
 
 }  // namespace
