@@ -1,7 +1,8 @@
 // Auto adjust: the parameters and their ranges, the small-image path, tone curves on images built
 // so that each rule shows in the pixels (the weight picked by the bright share, the channel
-// limit, the cut-off), exact arithmetic on an image large enough to overflow 32 bits, in-place
-// use, refusals, the memory the pass needs, its gain table and the plain reference form.
+// limit, the cut-off), exact arithmetic on an image large enough to overflow 32 bits, its gain
+// table and the plain reference form. Refusals, in-place use and a missing gain table are in the
+// bad-input and allocation-failure tables.
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -9,7 +10,6 @@
 #include <vector>
 
 #include "auto/auto_adjust.h"
-#include "frame/alloc_hook.h"
 #include "photofx.h"
 #include "reference/auto_adjust.h"
 #include "support/images.h"
@@ -173,15 +173,6 @@ TEST(AutoAdjust, LargeImagesKeepEveryProductExact) {
   EXPECT_EQ(img[static_cast<size_t>(W) * (H - kBandRows)], img.back());
 }
 
-TEST(AutoAdjust, InPlaceMatchesSeparateBuffers) {
-  const Pixels img = pfx::test::random_image(151, 157, 5);
-  const Pixels out = process(img, 151, 157);
-  Pixels in_place = img;
-  EXPECT_EQ(applyAutoAdjust(in_place.data(), in_place.data(), 151, 157), PHOTOFX_SUCCESS);
-  EXPECT_EQ(in_place, out);
-  EXPECT_NE(out, img);
-}
-
 // A host may store any value in the globals directly; each counts as the nearer end of its
 // range, so no weight can zero a divisor and no cut-off can overflow the curve.
 TEST(AutoAdjust, ParametersStoredOutOfRangeCountAsTheNearerEnd) {
@@ -194,43 +185,6 @@ TEST(AutoAdjust, ParametersStoredOutOfRangeCountAsTheNearerEnd) {
   EXPECT_EQ(with(-5, INT32_MAX, 0, INT32_MIN), with(0, 100, 300, 300));
   EXPECT_EQ(with(INT32_MAX, -7, INT32_MAX, -1), with(127, 0, 8196, 300));
   EXPECT_EQ(with(200, 101, 8197, 299), with(127, 100, 8196, 300));
-}
-
-TEST(AutoAdjust, RefusalsWriteNothing) {
-  const Pixels img = pfx::test::random_image(150, 150, 3);
-  Pixels dst(img.size(), kUntouched);
-  const Pixels untouched = dst;
-  constexpr int32_t kBad = PHOTOFX_INVALID_ARGUMENT;
-  for (int32_t side : {10, 150}) {
-    EXPECT_EQ(applyAutoAdjust(nullptr, dst.data(), side, side), kBad);
-    EXPECT_EQ(applyAutoAdjust(img.data(), nullptr, side, side), kBad);
-    EXPECT_EQ(fx_process_hdr(nullptr, dst.data(), side, side), kBad);
-    EXPECT_EQ(fx_process_hdr(img.data(), nullptr, side, side), kBad);
-  }
-  // Too large to address, on either path: refused before anything is read.
-  EXPECT_EQ(fx_process_hdr(img.data(), dst.data(), 65536, 65536), kBad);
-  EXPECT_EQ(fx_process_hdr(img.data(), dst.data(), 100, INT32_MAX), kBad);
-  EXPECT_EQ(dst, untouched);
-}
-
-// The pass keeps no planes: small images allocate nothing, large ones only the gain table, and
-// without that table they divide instead, with the same result. Out of memory cannot happen.
-TEST(AutoAdjust, NeedsNoMemoryItCannotDoWithout) {
-  const Pixels small = pfx::test::random_image(150, 150, 3);
-  pfx::arm_allocation_failure(1);
-  EXPECT_EQ(applyAutoAdjust(small.data(), Pixels(small.size()).data(), 150, 150), PHOTOFX_SUCCESS);
-  EXPECT_EQ(pfx::allocation_requests(), 0);
-
-  const Pixels large = pfx::test::random_image(512, 300, 4);
-  Pixels with_table(large.size(), kUntouched), without(large.size(), kUntouched);
-  pfx::arm_allocation_failure(2);
-  EXPECT_EQ(fx_process_hdr(large.data(), with_table.data(), 512, 300), PHOTOFX_SUCCESS);
-  EXPECT_EQ(pfx::allocation_requests(), 1);
-  pfx::arm_allocation_failure(1);
-  EXPECT_EQ(fx_process_hdr(large.data(), without.data(), 512, 300), PHOTOFX_SUCCESS);
-  pfx::arm_allocation_failure(0);
-  EXPECT_EQ(without, with_table);
-  EXPECT_NE(with_table, large);
 }
 
 // The gain table holds new_luma / luma for every luma, whatever the curve: every new luma a curve
