@@ -1,13 +1,13 @@
 // The six preset looks: worked results of every look on black, white, grey and a colour (the
 // strongest check of the whole adjustment stack beneath them), in-place use, downlight following
 // the auto-adjust parameters, and preset compositing: the rectangle and the mask, bounds clipped
-// to the image, and nothing written on refusal or when the scratch image cannot be had.
+// to the image. (Refusals and a scratch image that cannot be had are in the bad-input and
+// allocation-failure tables.)
 #include <gtest/gtest.h>
 
 #include <cstdint>
 #include <vector>
 
-#include "frame/alloc_hook.h"
 #include "photofx.h"
 #include "support/images.h"
 
@@ -190,42 +190,6 @@ TEST(PresetCompositing, BoundsPickTheModeAndAreClippedToTheImage) {
     const bool inside = i % W >= W - 2 && i / W == H - 1;
     EXPECT_EQ(corner[i], inside ? whole[i] : kUntouched) << i;
   }
-}
-
-TEST(PresetCompositing, RefusalsAndAFailedScratchImageWriteNothing) {
-  const Pixels img = pfx::test::random_image(8, 6, 29);
-  const Mask mask(img.size(), 1);
-  Pixels dst(img.size(), kUntouched);
-  const Pixels untouched = dst;
-  for (const Look& look : kLooks) {
-    look.entry_full(nullptr, dst.data(), 8, 6);
-    look.entry_full(img.data(), nullptr, 8, 6);
-    look.entry_partial(nullptr, mask.data(), dst.data(), 8, 6, 0, 7, 0, 5);
-    look.entry_partial(img.data(), mask.data(), nullptr, 8, 6, 0, 7, 0, 5);
-    look.entry_partial(img.data(), nullptr, dst.data(), 8, 6, 0, 7, 0, 5);
-    for (int32_t side : {0, -4}) {
-      look.fx_full(img.data(), dst.data(), side, 6);
-      look.fx_partial(img.data(), mask.data(), dst.data(), 8, side, 1, 0, 0, 0);
-    }
-    look.fx_full(img.data(), dst.data(), 65536, 65536);
-    look.fx_partial(img.data(), mask.data(), dst.data(), INT32_MAX, 2, 1, 0, 0, 0);
-    pfx::arm_allocation_failure(1);  // the scratch image
-    look.fx_partial(img.data(), mask.data(), dst.data(), 8, 6, 1, 0, 0, 0);
-    pfx::arm_allocation_failure(0);
-    EXPECT_EQ(dst, untouched) << look.name;
-  }
-}
-
-// The auto-adjust pass inside downlight needs no memory it cannot do without: with every
-// allocation failing, the full look still runs all of its passes.
-TEST(PresetLooks, DownlightDoesNotDependOnMemory) {
-  const Pixels img = pfx::test::random_image(150, 150, 30);
-  const Pixels expected = full(fx_apply_downlight, img, 150, 150);
-  for (int64_t n = 1; n <= 2; ++n) {
-    pfx::arm_allocation_failure(n);
-    EXPECT_EQ(full(fx_apply_downlight, img, 150, 150), expected) << n;
-  }
-  pfx::arm_allocation_failure(0);
 }
 
 }  // namespace
