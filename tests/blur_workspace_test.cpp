@@ -1,6 +1,6 @@
 // Depth-of-field blur: the reduction rule, scale-down, what compositing changes, the
-// workspace life cycle and its globals, the one-shot path, the untouched selection mask, tiny
-// images and failed allocations.
+// workspace life cycle and its globals, the one-shot path, the untouched selection mask and tiny
+// images. (Failed allocations are in the allocation-failure table.)
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -257,33 +257,6 @@ TEST_F(Workspace, TinyImagesAreCopiedAndRefusedCallsWriteNothing) {
   fx_make_blur_preview(img.data(), ones.data(), dst.data(), -20, 20, 8);
   fx_make_blur_preview(img.data(), ones.data(), nullptr, 20, 20, 8);
   EXPECT_EQ(dst, untouched);
-}
-
-// An init whose allocations fail leaves no workspace, so the next preview writes nothing, and a
-// preview whose scratch fails writes nothing either. (Every allocation of every blur entry point
-// failing, with the globals checked, is in the allocation-failure table.)
-TEST_F(Workspace, FailedAllocationsLeaveNoWorkspaceAndNoOutput) {
-  constexpr int32_t W = 500, H = 60;  // k = 1
-  const Pixels img = pfx::test::random_image(W, H, 19);
-  const Mask mask = disc_mask(W, H, 250, 30, 20);
-  const Pixels untouched(img.size(), kUntouched);
-  Pixels dst = untouched;
-  auto preview = [&] { fx_make_blur_preview(img.data(), mask.data(), dst.data(), W, H, 6); };
-  for (int64_t n = 1; n <= 3; ++n) {
-    pfx::arm_allocation_failure(n);
-    fx_Init_blur(img.data(), mask.data(), W, H, 0, W - 1, 0, H - 1);
-    pfx::arm_allocation_failure(0);
-    EXPECT_TRUE(no_workspace()) << n;
-    preview();
-    EXPECT_EQ(dst, untouched) << n;
-  }
-  fx_Init_blur(img.data(), mask.data(), W, H, 0, W - 1, 0, H - 1);
-  pfx::arm_allocation_failure(1);
-  preview();
-  pfx::arm_allocation_failure(0);
-  EXPECT_EQ(dst, untouched);
-  preview();
-  EXPECT_EQ(dst, blur_once(img, mask.data(), W, H, 6));
 }
 
 }  // namespace
