@@ -81,8 +81,8 @@ struct Args {
   const uint32_t* texture = nullptr;
   int32_t width = 0, height = 0;
   int32_t level[4] = {};
-  double real = 0;                  // control_gamma's gamma
-  Bounds bounds{1, 0, 0, 0};        // whole-image mode
+  double real = 0;                     // control_gamma's gamma
+  Bounds bounds{1, 0, 0, 0};           // whole-image mode
   int32_t cx = 0, cy = 0, radius = 0;  // brushes, dabs and the circle warps
   uint32_t fast = 0;
   int32_t pos = 0, out_width = 0, out_height = 0;  // mirror
@@ -240,8 +240,7 @@ int64_t mirror_size(const Args& a) {
 
 template <auto F>
 int64_t blur_init(const Args& a) {
-  F(a.src, a.mask, a.width, a.height, a.bounds.left, a.bounds.right, a.bounds.top,
-    a.bounds.bottom);
+  F(a.src, a.mask, a.width, a.height, a.bounds.left, a.bounds.right, a.bounds.top, a.bounds.bottom);
   return kNoCode;
 }
 
@@ -368,7 +367,8 @@ inline int64_t fatan2(const Args& a) { return FATAN2(a.level[0], a.level[1]); }
 // The memory wrappers on a block of level[0] x level[1] bytes (held small): whether each did
 // what it says.
 inline int64_t memory(const Args& a) {
-  const uint32_t n = static_cast<uint32_t>(a.level[0]) & 255u, size = static_cast<uint32_t>(a.level[1]) & 15u;
+  const uint32_t n = static_cast<uint32_t>(a.level[0]) & 255u,
+                 size = static_cast<uint32_t>(a.level[1]) & 15u;
   auto* zeroed = static_cast<uint8_t*>(fx_calloc(n, size));
   auto* block = static_cast<uint8_t*>(fx_malloc(n, size));
   int64_t ok = 0;
@@ -402,7 +402,8 @@ inline constexpr Level kStrength[] = {{"strength", 0, 255, 0}};
 inline constexpr Level kShift[] = {{"shift", 0, 31, 0}};
 inline constexpr Level kBlurLevel[] = {{"level", 0, 8, 8}};
 inline constexpr Level kGamma[] = {{"channel", 0, 3, 0}};
-inline constexpr Level kLevels[] = {{"channel", 0, 3, 0}, {"low", 0, 255, 0}, {"high", 0, 255, 255}};
+inline constexpr Level kLevels[] = {
+    {"channel", 0, 3, 0}, {"low", 0, 255, 0}, {"high", 0, 255, 255}};
 inline constexpr Level kSphere[] = {{"level", -100, 100, 0}};
 inline constexpr Level kTwirl[] = {{"angle", -360, 360, 0}};
 inline constexpr Level kMirrorLevels[] = {{"mode", MIRROR_KEEP_LEFT, MIRROR_KEEP_BOTTOM, 0},
@@ -426,12 +427,12 @@ inline constexpr Level kBlock[] = {{"count", 0, 255, 0}, {"size", 0, 15, 0}};
 // ---- Representative arguments ------------------------------------------------------------------
 
 // The slider levels and far beyond them, where no arithmetic may overflow.
-inline constexpr Rep kSliderReps[] = {{{14}}, {{kMin}}, {{-45}}, {{-3}}, {{0}},  {{4}},  {{10}},
+inline constexpr Rep kSliderReps[] = {{{14}}, {{kMin}}, {{-45}}, {{-3}}, {{0}},    {{4}},   {{10}},
                                       {{13}}, {{20}},   {{27}},  {{55}}, {{2000}}, {{kMax}}};
-inline constexpr Rep kPercentReps[] = {{{70}}, {{kMin}}, {{-1}},  {{0}},  {{1}},
+inline constexpr Rep kPercentReps[] = {{{70}}, {{kMin}}, {{-1}}, {{0}},   {{1}},
                                        {{35}}, {{50}},   {{99}}, {{100}}, {{101}}};
-inline constexpr Rep kGainReps[] = {{{14, 5, 9}},  {{10, 10, 10}}, {{20, 10, 10}},
-                                    {{0, 15, 7}},  {{3, 18, 12}},  {{-5, 30, 10}},
+inline constexpr Rep kGainReps[] = {{{14, 5, 9}},  {{10, 10, 10}},    {{20, 10, 10}},
+                                    {{0, 15, 7}},  {{3, 18, 12}},     {{-5, 30, 10}},
                                     {{20, 0, 20}}, {{kMax, kMin, 10}}};
 inline constexpr Rep kHueReps[] = {{{200}}, {{-1}},  {{0}},   {{30}},  {{61}}, {{90}},
                                    {{180}}, {{270}}, {{359}}, {{360}}, {{361}}};
@@ -439,31 +440,31 @@ inline constexpr Rep kStrengthReps[] = {{{64}}, {{0}}, {{120}}, {{255}}, {{kMax}
 inline constexpr Rep kShiftReps[] = {{{2}}, {{0}}, {{1}}, {{3}}, {{5}}, {{31}}, {{-1}}, {{32}}};
 inline constexpr Rep kDabShiftReps[] = {{{4}}, {{0}}, {{2}}, {{3}}, {{32}}};
 inline constexpr Rep kSharpenReps[] = {{{10}}, {{0}}, {{20}}};
-inline constexpr Rep kBlurReps[] = {{{8}}, {{-1}}, {{0}}, {{1}}, {{2}}, {{3}},
+inline constexpr Rep kBlurReps[] = {{{8}}, {{-1}}, {{0}}, {{1}}, {{2}},  {{3}},
                                     {{4}}, {{5}},  {{6}}, {{7}}, {{100}}};
 inline constexpr Rep kSphereReps[] = {{{50}}, {{-101}}, {{-100}}, {{-57}}, {{-1}},
                                       {{0}},  {{1}},    {{33}},   {{100}}};
 inline constexpr Rep kTwirlReps[] = {{{90}}, {{-361}}, {{-360}}, {{-200}}, {{-45}},
                                      {{0}},  {{1}},    {{271}},  {{360}}};
-inline constexpr Rep kMirrorReps[] = {{{MIRROR_KEEP_LEFT, MIRROR_HORIZONTAL}},
-                                      {{MIRROR_KEEP_RIGHT, MIRROR_HORIZONTAL}},
-                                      {{MIRROR_KEEP_TOP, MIRROR_VERTICAL}},
-                                      {{MIRROR_KEEP_BOTTOM, MIRROR_VERTICAL}},
-                                      {{MIRROR_KEEP_TOP, MIRROR_HORIZONTAL}},
-                                      {{MIRROR_KEEP_LEFT, 0}}};
+inline constexpr Rep kMirrorReps[] = {
+    {{MIRROR_KEEP_LEFT, MIRROR_HORIZONTAL}}, {{MIRROR_KEEP_RIGHT, MIRROR_HORIZONTAL}},
+    {{MIRROR_KEEP_TOP, MIRROR_VERTICAL}},    {{MIRROR_KEEP_BOTTOM, MIRROR_VERTICAL}},
+    {{MIRROR_KEEP_TOP, MIRROR_HORIZONTAL}},  {{MIRROR_KEEP_LEFT, 0}}};
 // The module's defaults first; 0 keeps a parameter as it is.
-inline constexpr Rep kParameterReps[] = {{{0, 0, 0, 0}},      {{0, 100, 1000, 300}},
+inline constexpr Rep kParameterReps[] = {{{0, 0, 0, 0}},           {{0, 100, 1000, 300}},
                                          {{127, 100, 8196, 5120}}, {{50, 60, 300, 8196}},
                                          {{70, 0, 1000, 5120}},    {{30, 1, 4000, 2000}}};
-inline constexpr Rep kSetterReps[] = {{{70, 100, 1000, 5120}}, {{127, 0, 300, 8196}},
-                                      {{128, 101, 299, 8197}}, {{-1, -1, kMin, kMax}},
+inline constexpr Rep kSetterReps[] = {{{70, 100, 1000, 5120}},
+                                      {{127, 0, 300, 8196}},
+                                      {{128, 101, 299, 8197}},
+                                      {{-1, -1, kMin, kMax}},
                                       {{0, 50, 8196, 300}}};
 inline constexpr Rep kReductionReps[] = {{{0}}, {{1}}, {{2}}};
 inline constexpr Rep kAllReps[] = {{{0}}, {{1}}};
 inline constexpr Rep kBlockReps[] = {{{16, 4}}, {{0, 4}}, {{255, 15}}, {{1, 0}}};
 
-inline constexpr double kGammas[] = {0.77, -1.0, 0.0,  0.3, 0.58,
-                                     1.0,  1.09, 2.35, 9.5, std::numeric_limits<double>::quiet_NaN()};
+inline constexpr double kGammas[] = {
+    0.77, -1.0, 0.0, 0.3, 0.58, 1.0, 1.09, 2.35, 9.5, std::numeric_limits<double>::quiet_NaN()};
 // Every channel selector, in range and not, with every gamma.
 inline constexpr auto kGammaReps = [] {
   std::array<Rep, 6 * std::size(kGammas)> reps{};
@@ -474,7 +475,7 @@ inline constexpr auto kGammaReps = [] {
   return reps;
 }();
 
-inline constexpr int32_t kLevelPairs[][2] = {{28, 255}, {0, 255},   {15, 243}, {45, 255},
+inline constexpr int32_t kLevelPairs[][2] = {{28, 255},  {0, 255},   {15, 243},   {45, 255},
                                              {100, 100}, {200, 100}, {-300, 600}, {11, 232},
                                              {-1, 256},  {0, 1},     {kMin, kMax}};
 inline constexpr auto kLevelsReps = [] {
@@ -526,7 +527,8 @@ constexpr uint16_t kCode = kReturnsCode;
 constexpr uint16_t kEntry = kEntryPoint;
 constexpr uint16_t kScratch = kAllocates;
 
-// ---- The table -----------------------------------------------------------------------------------
+// ---- The table
+// -----------------------------------------------------------------------------------
 
 // clang-format off
 inline constexpr Export kExports[] = {
@@ -638,7 +640,7 @@ inline constexpr Export kExports[] = {
     row("applyBlur", Shape::kPartial, partial<applyBlur>, kBlurLevel, kBlurReps, kEntry | kScratch),
     row("make_gaussian_blur", Shape::kWorking, working<make_gaussian_blur>, kBlurLevel, kBlurReps, kScratch),
     row("make_lens_blur", Shape::kWorking, working<make_lens_blur>, kBlurLevel, kBlurReps),
-    row("run_blur", Shape::kComposite, run_blur_call, kAllFlag, kAllReps, kWorkspace | kScratch),
+    row("run_blur", Shape::kComposite, run_blur_call, kAllFlag, kAllReps, kWorkspace),
     row("initTiltShift", Shape::kTiltInit, tilt_init<initTiltShift>, {}, {}, kEntry | kWorkspace | kScratch),
     row("makeTiltShift", Shape::kTilt, tilt<makeTiltShift>, kBand, {}, kEntry | kWorkspace | kScratch),
     row("applyTiltShift", Shape::kTilt, tilt<applyTiltShift>, kBand, {}, kEntry | kScratch),
@@ -648,7 +650,7 @@ inline constexpr Export kExports[] = {
     row("fx_apply_tiltshift", Shape::kTilt, tilt<fx_apply_tiltshift>, kBand, {}, kScratch),
     row("fx_destroy_tiltshift", Shape::kRelease, release<fx_destroy_tiltshift>, {}, {}, kWorkspace),
     row("make_tiltshift", Shape::kWorking, working<make_tiltshift>, {}, {}, kScratch),
-    row("restore_tiltshift", Shape::kComposite, restore_tiltshift_call, kBand, {}, kScratch),
+    row("restore_tiltshift", Shape::kComposite, restore_tiltshift_call, kBand, {}),
     row("make_tiltshift_lens", Shape::kWorking, working<make_tiltshift_lens>, kBand, {}),
 
     // Sharpen, pixelize and red-eye.

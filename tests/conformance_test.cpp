@@ -67,26 +67,11 @@ void add_bytes(Digest& d, const uint8_t* b, size_t n) {
 
 // ---- Inputs and placements -------------------------------------------------------------------
 
-bool works_reduced(const cat::Export& e) {
-  switch (e.shape) {
-    case Shape::kBlurInit:
-    case Shape::kBlurPreview:
-    case Shape::kTiltInit:
-    case Shape::kTilt:
-    case Shape::kScale:
-    case Shape::kWorking:
-    case Shape::kComposite:
-      return true;
-    default:
-      return e.levels.data() == cat::kBlurLevel;
-  }
-}
-
 // The usual inputs; the blur family adds one its working copy reduces by 4 per side (880 x 52),
 // and auto adjust one large enough for its tone curve.
 std::vector<Input> inputs_of(const cat::Export& e) {
   std::vector<Input> v = pfx::test::conformance_inputs();
-  if (works_reduced(e)) {
+  if (pfx::test::works_reduced(e)) {
     v.push_back({"wide", 880, 52, pfx::test::random_image(880, 52, 2027),
                  pfx::test::random_mask(880, 52, 52)});
   }
@@ -169,9 +154,9 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
       }
       return;
     case Shape::kBrush: {
-      const int32_t strokes[][3] = {{w / 2, h / 2, 7},  {0, 0, 12}, {w - 1, h - 1, 5},
-                                    {-3, h / 3, 9},     {w + 2, 4, 6}, {5, 5, 0},
-                                    {5, 5, -4},         {w / 2, h / 2, 200}, {w / 4, h / 4, 1}};
+      const int32_t strokes[][3] = {{w / 2, h / 2, 7}, {0, 0, 12},          {w - 1, h - 1, 5},
+                                    {-3, h / 3, 9},    {w + 2, 4, 6},       {5, 5, 0},
+                                    {5, 5, -4},        {w / 2, h / 2, 200}, {w / 4, h / 4, 1}};
       for (const auto& s : strokes) {
         out = in.pixels;
         a.cx = s[0], a.cy = s[1], a.radius = s[2];
@@ -180,9 +165,9 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
       return;
     }
     case Shape::kDab: {
-      const int32_t dabs[][3] = {{w / 2, h / 2, 5}, {0, h / 3, 7},      {w - 1, h - 1, 9},
-                                 {-4, -3, 8},       {w + 2, h / 2, 4},  {w / 3, h / 4, 0},
-                                 {w / 3, 2, -3},    {w / 2, h / 2, 10000}, {w / 4, h - 2, 13},
+      const int32_t dabs[][3] = {{w / 2, h / 2, 5},  {0, h / 3, 7},         {w - 1, h - 1, 9},
+                                 {-4, -3, 8},        {w + 2, h / 2, 4},     {w / 3, h / 4, 0},
+                                 {w / 3, 2, -3},     {w / 2, h / 2, 10000}, {w / 4, h - 2, 13},
                                  {3 * w / 4, -1, 6}, {w * 4, h * 4, 2}};
       for (const auto& s : dabs) {
         out = in.pixels;
@@ -192,8 +177,8 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
       return;
     }
     case Shape::kWarp: {
-      const int32_t circles[][3] = {{w / 2, h / 2, h / 3}, {3, h - 4, 9}, {w - 1, 0, w},
-                                    {w / 3, h / 2, 1}};
+      const int32_t circles[][3] = {
+          {w / 2, h / 2, h / 3}, {3, h - 4, 9}, {w - 1, 0, w}, {w / 3, h / 2, 1}};
       const cat::Bounds windows[] = {{0, w - 1, 0, h - 1},
                                      {w / 5, w - 8, h / 4, h - 3},
                                      {-9, w + 9, -4, h + 40},
@@ -247,14 +232,13 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
       }
       fx_destroy_blur();
       return;
-    case Shape::kScale:
-      {
-        const size_t n = static_cast<size_t>(w >> (rep.v[0] & 31)) *
-                         static_cast<size_t>(h >> (rep.v[0] & 31)) * 3;
-        Bytes o(n, 0xA5);
-        a.work_out = o.data();
-        e.call(a), add_bytes(d, o.data(), o.size());
-      }
+    case Shape::kScale: {
+      const size_t n =
+          static_cast<size_t>(w >> (rep.v[0] & 31)) * static_cast<size_t>(h >> (rep.v[0] & 31)) * 3;
+      Bytes o(n, 0xA5);
+      a.work_out = o.data();
+      e.call(a), add_bytes(d, o.data(), o.size());
+    }
       return;
     case Shape::kWorking:
     case Shape::kComposite: {
@@ -372,9 +356,9 @@ std::vector<std::pair<std::string, uint64_t>> goldens_of(const cat::Export& e, s
     default:
       break;
   }
-  const std::vector<cat::Rep> reps =
-      e.reps.empty() ? std::vector<cat::Rep>{cat::Rep{}}
-                     : std::vector<cat::Rep>(e.reps.begin(), e.reps.end());
+  const std::vector<cat::Rep> reps = e.reps.empty()
+                                         ? std::vector<cat::Rep>{cat::Rep{}}
+                                         : std::vector<cat::Rep>(e.reps.begin(), e.reps.end());
   for (const cat::Rep& rep : reps) {
     uint64_t v = 0;
     if (pfx::test::is_image_call(e.shape)) {

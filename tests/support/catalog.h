@@ -31,6 +31,23 @@ inline bool is_frame_call(cat::Shape s) {
   return s == S::kFull || s == S::kPartial || s == S::kTextureFull || s == S::kTexturePartial;
 }
 
+// The blur family, which works on a copy reduced by a power of two from 421 pixels up.
+inline bool works_reduced(const cat::Export& e) {
+  using S = cat::Shape;
+  switch (e.shape) {
+    case S::kBlurInit:
+    case S::kBlurPreview:
+    case S::kTiltInit:
+    case S::kTilt:
+    case S::kScale:
+    case S::kWorking:
+    case S::kComposite:
+      return true;
+    default:
+      return e.levels.data() == cat::kBlurLevel;
+  }
+}
+
 inline bool is_partial(cat::Shape s) {
   return s == cat::Shape::kPartial || s == cat::Shape::kTexturePartial;
 }
@@ -84,7 +101,10 @@ struct Buffers {
     a.sw = width;
     a.sh = height;
     if (e.shape == cat::Shape::kMirror) {
-      a.pos = (rep.v[1] == MIRROR_VERTICAL ? height : width) / 2 - 1;
+      // About the middle, so that the output fits the destination.
+      const int32_t side = rep.v[1] == MIRROR_VERTICAL ? height : width;
+      const bool keep_low = rep.v[0] == MIRROR_KEEP_LEFT || rep.v[0] == MIRROR_KEEP_TOP;
+      a.pos = keep_low ? side / 2 - 1 : side - side / 2;
       a.out_width = fx_get_mirror_out_width(width, a.pos, rep.v[0], rep.v[1]);
       a.out_height = fx_get_mirror_out_height(height, a.pos, rep.v[0], rep.v[1]);
     }
