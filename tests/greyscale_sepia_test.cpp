@@ -16,42 +16,6 @@ namespace {
 using pfx::test::argb;
 using pfx::test::Pixels;
 
-uint32_t grey(uint32_t p, int32_t level) {
-  uint32_t out = 0;
-  fx_control_greyscale_all(&p, &out, 1, 1, level);
-  return out;
-}
-
-// The grey of a channel mean m is floor(m x gain / 65536), gain = (level - 10) x 4000 + 65536,
-// held to 0..255. Computed here in double, which is exact at these magnitudes, for levels well
-// past both slider ends and at the ends of the int32_t range.
-TEST(Greyscale, GainFollowsTheLevelAtAndBeyondTheSliderEnds) {
-  std::vector<int32_t> levels = {INT32_MIN, INT32_MIN + 1, -100000,
-                                 INT32_MAX, INT32_MAX - 1, 1 << 30};
-  for (int32_t level = -40; level <= 1100; ++level) levels.push_back(level);
-  for (int32_t level : levels) {
-    const double gain = (static_cast<double>(level) - 10.0) * 4000.0 + 65536.0;
-    for (uint32_t m = 0; m < 256; ++m) {
-      const double exact = std::floor(m * gain / 65536.0);
-      const uint32_t v = exact < 0 ? 0 : (exact > 255 ? 255 : static_cast<uint32_t>(exact));
-      ASSERT_EQ(grey(argb(0xFF, m, m, m), level), argb(0xFF, v, v, v)) << m << " level " << level;
-    }
-  }
-}
-
-// The entry points forward to the implementations (whose partial rule frame_test pins).
-TEST(Greyscale, EntryPointsForward) {
-  const Pixels img = pfx::test::random_image(9, 8, 32);
-  const pfx::test::Mask mask = pfx::test::random_mask(9, 8, 33);
-  Pixels expected(img.size()), actual(img.size());
-  fx_control_greyscale_all(img.data(), expected.data(), 9, 8, 14);
-  controlGreyscale(img.data(), actual.data(), 9, 8, 14);
-  EXPECT_EQ(actual, expected);
-  fx_control_greyscale(img.data(), mask.data(), expected.data(), 9, 8, 7, 2, 6, 1, 5);
-  controlGreyscalePartial(img.data(), mask.data(), actual.data(), 9, 8, 7, 2, 6, 1, 5);
-  EXPECT_EQ(actual, expected);
-}
-
 // The curves again, from the runs of equal offset they are known by: {run length, offset}.
 std::vector<int32_t> curve_from_runs(const std::vector<std::pair<int32_t, int32_t>>& runs,
                                      int32_t sign) {

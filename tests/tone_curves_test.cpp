@@ -57,46 +57,6 @@ TEST(ToneCurves, GammaCurveFollowsThePowerRule) {
   }
 }
 
-// Gammas the library never passes: zero and NaN leave only 255 lit, a negative gamma lights
-// everything. Each is a byte curve, reached without converting an infinity to an integer.
-TEST(ToneCurves, DegenerateGammasStillGiveByteCurves) {
-  const auto zero = gamma_curve(0.0);
-  const auto nan = gamma_curve(std::numeric_limits<double>::quiet_NaN());
-  const auto negative = gamma_curve(-1.0);
-  for (size_t n = 0; n < 256; ++n) {
-    EXPECT_EQ(zero[n], n == 255 ? 255 : 0) << n;
-    EXPECT_EQ(nan[n], n == 255 ? 255 : 0) << n;
-    EXPECT_EQ(negative[n], 255) << n;
-  }
-}
-
 using Levels = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t, int32_t, int32_t, int32_t);
-
-std::vector<int32_t> levels_curve(Levels fn, int32_t low, int32_t high) {
-  return curve_of([&](const uint32_t* s, uint32_t* d) { fn(s, d, 256, 1, 0, low, high); });
-}
-
-// Levels beyond 0..255 follow the same formulas in exact arithmetic, held to a byte.
-TEST(ToneCurves, LevelsOutsideTheByteRangeDoNotOverflow) {
-  // Scale 512: (512 x 255) >> 10.
-  EXPECT_EQ(levels_curve(changeHistogramByInput, -255, 255)[0], 127);
-  EXPECT_EQ(levels_curve(changeHistogramByInput, INT32_MIN, INT32_MAX), std::vector<int32_t>(256));
-  // Scale 3614: (3614 x 100) >> 10 = 352, less 300.
-  EXPECT_EQ(levels_curve(changeHistogramByOutput, -300, 600)[100], 52);
-  const auto huge = levels_curve(changeHistogramByOutput, INT32_MIN, INT32_MAX);
-  EXPECT_EQ(huge[0], 0);
-  EXPECT_EQ(huge[255], 255);
-}
-
-// An input range with nothing in it has no scale to divide by: nothing is written.
-TEST(ToneCurves, EmptyRangesWriteNothing) {
-  const Pixels img = pfx::test::random_image(6, 5, 82);
-  const Pixels untouched(img.size(), 0xC3C3C3C3u);
-  Pixels dst = untouched;
-  changeHistogramByInput(img.data(), dst.data(), 6, 5, 0, 100, 100);
-  changeHistogramByOutput(img.data(), dst.data(), 6, 5, 0, 100, 99);
-  changeHistogramByInput(img.data(), dst.data(), 6, 5, 0, INT32_MAX, INT32_MIN);
-  EXPECT_EQ(dst, untouched);
-}
 
 }  // namespace

@@ -21,42 +21,6 @@ constexpr int32_t kDomain = 33;  // the error word after an argument outside the
 
 int32_t& err() { return pfx::fix_error_word(); }
 
-// Rounds a double reference of a table entry, after making sure it is far enough from a rounding
-// half that double precision cannot have tipped it.
-int32_t settled_round(double exact, const char* table, int i) {
-  const double frac = std::fabs(exact) - std::floor(std::fabs(exact));
-  EXPECT_GT(std::fabs(frac - 0.5), 1e-6) << table << "[" << i << "] is too close to a half";
-  return static_cast<int32_t>(std::round(exact));  // halves away from zero
-}
-
-// Angle in units (256 to the turn) of a 16.16 angle.
-double units(int64_t fixed_angle) { return static_cast<double>(fixed_angle) / 65536.0; }
-
-TEST(Trig, TablesMatchTheirRulesEntryByEntry) {
-  for (int i = 0; i < 512; ++i) {
-    EXPECT_EQ(_cos_tbl[i], settled_round(std::cos(2 * kPi * i / 512) * 65536, "_cos_tbl", i)) << i;
-  }
-  for (int i = 0; i < 256; ++i) {
-    if (i == 128) continue;
-    EXPECT_EQ(_tan_tbl[i], settled_round(std::tan(kPi * i / 256) * 65536, "_tan_tbl", i)) << i;
-  }
-  EXPECT_EQ(_tan_tbl[128], kPole);
-  for (int i = 0; i < 513; ++i) {
-    const double angle = std::acos(i / 256.0 - 1.0) * (256 / (2 * kPi)) * 65536;
-    EXPECT_EQ(_acos_tbl[i], settled_round(angle, "_acos_tbl", i)) << i;
-  }
-  EXPECT_EQ(fixtorad_r, settled_round(2 * kPi / 256 * 65536, "fixtorad_r", 0));
-  EXPECT_EQ(radtofix_r, settled_round(256 / (2 * kPi) * 65536, "radtofix_r", 0));
-  // The entries nearest a half, worked out to 70 digits; see the note in fixmath/trig.cpp.
-  EXPECT_EQ(_acos_tbl[24], 7223159);   // 7223158.50036
-  EXPECT_EQ(_acos_tbl[488], 1165449);  // 1165449.49964
-  EXPECT_EQ(_tan_tbl[59], 57950);      // 57949.50121
-  EXPECT_EQ(_tan_tbl[197], -57950);
-  EXPECT_EQ(_cos_tbl[83], 34380);  // 34379.50944
-  EXPECT_EQ(_cos_tbl[173], -34380);
-  EXPECT_EQ(fixtorad_r, 1608);  // 1608.49544
-}
-
 struct Call {
   const char* text;
   int32_t (*fn)();
@@ -102,64 +66,6 @@ const Call kCalls[] = {
     CALL(fixasin(-65537), 0, kDomain), CALL(fixasin(INT32_MAX), 0, kDomain),
 };
 // clang-format on
-
-TEST(Trig, ResultsAndErrorWord) {
-  for (const Call& c : kCalls) {
-    err() = 0;
-    EXPECT_EQ(c.fn(), c.expected) << c.text;
-    EXPECT_EQ(err(), c.error) << c.text;
-  }
-  // The arctangent of two clears an earlier error, except on the axes, which return early.
-  err() = 34;
-  EXPECT_EQ(fixatan2(3, 4), fixatan(fixdiv(3, 4)));
-  EXPECT_EQ(err(), 0);
-  err() = 34;
-  EXPECT_EQ(fixatan2(9, 0), kQuarter);
-  EXPECT_EQ(err(), 34);
-}
-
-TEST(Trig, EveryEntryIsReadAtItsAnglesInEveryTurn) {
-  // Around each entry the angles from a quarter step below to just under a quarter step above
-  // read it; the same holds any whole number of turns away, negative ones included. The tangent
-  // repeats every half turn, and the arctangent finds every entry exactly.
-  for (int64_t turn : {-128, -3, -1, 0, 1, 5, 127}) {
-    for (int64_t i = 0; i < 512; ++i) {
-      for (int64_t offset : {int64_t{-0x4000}, int64_t{-1}, int64_t{0}, int64_t{0x3FFF}}) {
-        const int64_t angle = turn * 0x1000000 + i * kStep + offset;
-        if (angle < INT32_MIN || angle > INT32_MAX) continue;
-        ASSERT_EQ(fixcos(static_cast<int32_t>(angle)), _cos_tbl[i]) << angle;
-        ASSERT_EQ(fixtan(static_cast<int32_t>(angle)), _tan_tbl[i % 256]) << angle;
-      }
-    }
-  }
-  for (int32_t i = 0; i < 256; ++i) {
-    EXPECT_EQ(fixatan(_tan_tbl[i]), i < 128 ? i * kStep : i * kStep - kHalf) << i;
-  }
-}
-
-TEST(Trig, ResultsFollowTheTrueFunctionsOverRandomArguments) {
-  pfx::test::Rng rng(52);
-  for (int n = 0; n < 300000; ++n) {
-    // Entries are half a unit apart, so the nearest is at most a quarter unit (2 pi / 1024
-    // radians) away: off by at most 65536 x 2 pi / 1024 ~ 402, plus rounding. The sine is the
-    // cosine a quarter turn earlier, to the bit.
-    const int32_t a = static_cast<int32_t>(rng.word());
-    const double radians = 2 * kPi * units(a) / 256;
-    ASSERT_NEAR(fixcos(a), std::cos(radians) * 65536, 403) << a;
-    ASSERT_NEAR(fixsin(a), std::sin(radians) * 65536, 403) << a;
-    ASSERT_EQ(fixsin(a), fixcos(static_cast<int32_t>(static_cast<uint32_t>(a) - kQuarter))) << a;
-    // The arctangent's last probe is one of the two entries around x, so it is at most one step
-    // from the exact angle; the arctangent of two adds a little for the truncated ratio.
-    const int32_t y = static_cast<int32_t>(rng.word()) >> (n % 32);
-    const int32_t x = static_cast<int32_t>(rng.word()) >> ((n / 32) % 32);
-    const int32_t t = fixatan(y);
-    ASSERT_NEAR(units(t), std::atan(y / 65536.0) / (2 * kPi) * 256, 0.5 + 1e-6) << y;
-    ASSERT_EQ(t % kStep, 0) << y;
-    if (x == 0) continue;
-    const double exact = std::atan2(static_cast<double>(y), static_cast<double>(x)) / (2 * kPi);
-    ASSERT_NEAR(units(fixatan2(y, x)), exact * 256, 0.5 + 1e-3) << y << ", " << x;
-  }
-}
 
 TEST(Trig, ArccosineAndArcsineReadTheNearestEntryAcrossTheWholeDomain) {
   err() = 34;  // successful calls leave the word alone
