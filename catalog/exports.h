@@ -429,15 +429,18 @@ inline constexpr Level kBlock[] = {{"count", 0, 255, 0}, {"size", 0, 15, 0}};
 // The slider levels and far beyond them, where no arithmetic may overflow.
 inline constexpr Rep kSliderReps[] = {{{14}}, {{kMin}}, {{-45}}, {{-3}}, {{0}},    {{4}},   {{10}},
                                       {{13}}, {{20}},   {{27}},  {{55}}, {{2000}}, {{kMax}}};
-inline constexpr Rep kPercentReps[] = {{{70}}, {{kMin}}, {{-1}}, {{0}},   {{1}},
-                                       {{35}}, {{50}},   {{99}}, {{100}}, {{101}}};
-inline constexpr Rep kGainReps[] = {{{14, 5, 9}},  {{10, 10, 10}},    {{20, 10, 10}},
-                                    {{0, 15, 7}},  {{3, 18, 12}},     {{-5, 30, 10}},
-                                    {{20, 0, 20}}, {{kMax, kMin, 10}}};
-inline constexpr Rep kHueReps[] = {{{200}}, {{-1}},  {{0}},   {{30}},  {{61}}, {{90}},
+inline constexpr Rep kFadeReps[] = {{{50}}, {{70}}, {{kMin}}, {{-1}},  {{0}},
+                                    {{1}},  {{35}}, {{99}},   {{100}}, {{101}}};
+inline constexpr Rep kGlowReps[] = {{{60}}, {{70}}, {{kMin}}, {{-1}},  {{0}},  {{1}},
+                                    {{35}}, {{50}}, {{99}},   {{100}}, {{101}}};
+inline constexpr Rep kGainReps[] = {{{14, 12, 8}},  {{14, 5, 9}},  {{10, 10, 10}},
+                                    {{20, 10, 10}}, {{0, 15, 7}},  {{3, 18, 12}},
+                                    {{-5, 30, 10}}, {{20, 0, 20}}, {{kMax, kMin, 10}}};
+inline constexpr Rep kHueReps[] = {{{30}},  {{-1}},  {{0}},   {{200}}, {{61}}, {{90}},
                                    {{180}}, {{270}}, {{359}}, {{360}}, {{361}}};
 inline constexpr Rep kStrengthReps[] = {{{64}}, {{0}}, {{120}}, {{255}}, {{kMax}}};
-inline constexpr Rep kShiftReps[] = {{{2}}, {{0}}, {{1}}, {{3}}, {{5}}, {{31}}, {{-1}}, {{32}}};
+inline constexpr Rep kShiftReps[] = {{{4}}, {{2}},  {{0}},  {{1}}, {{3}},
+                                     {{5}}, {{31}}, {{-1}}, {{32}}};
 inline constexpr Rep kDabShiftReps[] = {{{4}}, {{0}}, {{2}}, {{3}}, {{32}}};
 inline constexpr Rep kSharpenReps[] = {{{10}}, {{0}}, {{20}}};
 inline constexpr Rep kBlurReps[] = {{{8}}, {{-1}}, {{0}}, {{1}}, {{2}},  {{3}},
@@ -478,14 +481,20 @@ inline constexpr auto kGammaReps = [] {
 inline constexpr int32_t kLevelPairs[][2] = {{28, 255},  {0, 255},   {15, 243},   {45, 255},
                                              {100, 100}, {200, 100}, {-300, 600}, {11, 232},
                                              {-1, 256},  {0, 1},     {kMin, kMax}};
-inline constexpr auto kLevelsReps = [] {
+// Every channel selector with every pair; the typical call first.
+constexpr auto levels_reps(size_t first) {
   std::array<Rep, 6 * std::size(kLevelPairs)> reps{};
   size_t i = 0;
   for (int32_t channel : {0, -1, 1, 2, 3, 4}) {
-    for (const auto& p : kLevelPairs) reps[i++] = Rep{{channel, p[0], p[1]}};
+    for (size_t k = 0; k < std::size(kLevelPairs); ++k) {
+      const auto& p = kLevelPairs[(k + first) % std::size(kLevelPairs)];
+      reps[i++] = Rep{{channel, p[0], p[1]}};
+    }
   }
   return reps;
-}();
+}
+inline constexpr auto kLevelsReps = levels_reps(0);
+inline constexpr auto kLevelsOutReps = levels_reps(3);
 
 // ---- Ranges of the value functions --------------------------------------------------------------
 
@@ -573,12 +582,12 @@ inline constexpr Export kExports[] = {
     row("fx_control_exposure", Shape::kPartial, partial<fx_control_exposure>, kSlider, kSliderReps, kCode),
     row("fx_control_hue_all", Shape::kFull, full<fx_control_hue_all>, kSlider, kSliderReps, kCode),
     row("fx_control_hue", Shape::kPartial, partial<fx_control_hue>, kSlider, kSliderReps, kCode),
-    row("controlFadedColour", Shape::kFull, full<controlFadedColour>, kPercent, kPercentReps, kEntry),
-    row("controlFadedColourPartial", Shape::kPartial, partial<controlFadedColourPartial>, kPercent, kPercentReps, kEntry | kMaskEveryMode),
+    row("controlFadedColour", Shape::kFull, full<controlFadedColour>, kPercent, kFadeReps, kEntry),
+    row("controlFadedColourPartial", Shape::kPartial, partial<controlFadedColourPartial>, kPercent, kFadeReps, kEntry | kMaskEveryMode),
     row("applyInvert", Shape::kFull, full<applyInvert>, {}, {}, kEntry),
     row("applyInvertPartial", Shape::kPartial, partial<applyInvertPartial>, {}, {}, kEntry | kMaskEveryMode),
-    row("fx_control_fadedcolor_all", Shape::kFull, full<fx_control_fadedcolor_all>, kPercent, kPercentReps, kCode),
-    row("fx_control_fadedcolor", Shape::kPartial, partial<fx_control_fadedcolor>, kPercent, kPercentReps, kCode | kMaskEveryMode),
+    row("fx_control_fadedcolor_all", Shape::kFull, full<fx_control_fadedcolor_all>, kPercent, kFadeReps, kCode),
+    row("fx_control_fadedcolor", Shape::kPartial, partial<fx_control_fadedcolor>, kPercent, kFadeReps, kCode | kMaskEveryMode),
     row("fx_apply_invert_all", Shape::kFull, full<fx_apply_invert_all>, {}, {}, kCode),
     row("fx_apply_invert", Shape::kPartial, partial<fx_apply_invert>, {}, {}, kCode | kMaskEveryMode),
     row("controlAdjustRGB", Shape::kFull, full<controlAdjustRGB>, kGains, kGainReps, kEntry),
@@ -677,7 +686,7 @@ inline constexpr Export kExports[] = {
     // Tone curves, vignette and the film looks.
     row("control_gamma", Shape::kFull, gamma, kGamma, kGammaReps),
     row("changeHistogramByInput", Shape::kFull, full<changeHistogramByInput>, kLevels, kLevelsReps),
-    row("changeHistogramByOutput", Shape::kFull, full<changeHistogramByOutput>, kLevels, kLevelsReps),
+    row("changeHistogramByOutput", Shape::kFull, full<changeHistogramByOutput>, kLevels, kLevelsOutReps),
     table("LUT_VIGNETTE", LUT_VIGNETTE),
     row("fx_apply_vignette", Shape::kFull, full<fx_apply_vignette>),
     row("fx_apply_vignette_prev", Shape::kFull, full<fx_apply_vignette_prev>),
@@ -697,10 +706,10 @@ inline constexpr Export kExports[] = {
     row("applyPopArt", Shape::kFull, full<applyPopArt>, {}, {}, kEntry),
     row("fx_apply_popart", Shape::kFull, full<fx_apply_popart>),
     row("fx_apply_popart_prev", Shape::kFull, full<fx_apply_popart_prev>),
-    row("applySoftglow", Shape::kFull, full<applySoftglow>, kPercent, kPercentReps, kEntry | kScratch),
-    row("applySoftglowPartial", Shape::kPartial, partial<applySoftglowPartial>, kPercent, kPercentReps, kEntry | kScratch),
-    row("fx_softglow", Shape::kFull, full<fx_softglow>, kPercent, kPercentReps, kCode | kScratch),
-    row("fx_softglow_partial", Shape::kPartial, partial<fx_softglow_partial>, kPercent, kPercentReps, kCode | kScratch),
+    row("applySoftglow", Shape::kFull, full<applySoftglow>, kPercent, kGlowReps, kEntry | kScratch),
+    row("applySoftglowPartial", Shape::kPartial, partial<applySoftglowPartial>, kPercent, kGlowReps, kEntry | kScratch),
+    row("fx_softglow", Shape::kFull, full<fx_softglow>, kPercent, kGlowReps, kCode | kScratch),
+    row("fx_softglow_partial", Shape::kPartial, partial<fx_softglow_partial>, kPercent, kGlowReps, kCode | kScratch),
 
     // Warps.
     table("ATAN", ATAN),
