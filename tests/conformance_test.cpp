@@ -21,19 +21,85 @@
 
 #include "fixmath/fixed.h"
 #include "support/catalog.h"
-#include "support/conformance.h"
 #include "support/paths.h"
 
 namespace {
 
 namespace cat = pfx::catalog;
 using cat::Shape;
-using pfx::test::Buffers;
 using pfx::test::Bytes;
-using pfx::test::Digest;
-using pfx::test::Input;
 using pfx::test::kUntouched;
 using pfx::test::Pixels;
+
+// ---- Inputs and the digest ------------------------------------------------------------------
+
+struct Input {
+  std::string name;
+  int32_t width, height;
+  Pixels pixels;
+  pfx::test::Mask mask;  // bytes from {0, 1, 2, 255}
+};
+
+// The real photograph crop (opaque, 64 x 48), enlarged by repeating each pixel `factor` times in
+// each direction for the effects that behave differently on larger images.
+Input photo_input(int32_t factor = 1) {
+  std::ifstream f(std::string(PHOTOFX_TEST_DATA_DIR) + "/coffee_64x48.argb", std::ios::binary);
+  const std::vector<unsigned char> b((std::istreambuf_iterator<char>(f)),
+                                     std::istreambuf_iterator<char>());
+  EXPECT_EQ(b.size(), 64u * 48u * 4u) << "missing tests/data/coffee_64x48.argb";
+  const int32_t w = 64 * factor, h = 48 * factor;
+  Pixels px(static_cast<size_t>(w) * static_cast<size_t>(h));
+  for (int32_t y = 0; y < h && b.size() == 64u * 48u * 4u; ++y) {
+    for (int32_t x = 0; x < w; ++x) {
+      const size_t i = 4 * (static_cast<size_t>(y / factor) * 64 + static_cast<size_t>(x / factor));
+      px[static_cast<size_t>(y) * w + x] = uint32_t{b[i]} | uint32_t{b[i + 1]} << 8 |
+                                           uint32_t{b[i + 2]} << 16 | uint32_t{b[i + 3]} << 24;
+    }
+  }
+  return {factor == 1 ? "photo" : "photo x" + std::to_string(factor), w, h, px,
+          pfx::test::random_mask(w, h, factor == 1 ? 48 : 4800 + factor)};
+}
+
+Input noise_input() {
+  return {"noise", 61, 37, pfx::test::random_image(61, 37, 2026),
+          pfx::test::random_mask(61, 37, 37)};
+}
+
+const std::vector<Input>& usual_inputs() {
+  static const std::vector<Input> inputs = {noise_input(), photo_input()};
+  return inputs;
+}
+
+// Region bounds of every mode: whole image (left > right), whole image (top > bottom), the full
+// rectangle, an inner rectangle and a single pixel.
+std::vector<cat::Bounds> bounds_modes(int32_t w, int32_t h) {
+  return {{1, 0, 0, h - 1},
+          {0, w - 1, 1, 0},
+          {0, w - 1, 0, h - 1},
+          {w / 4, 3 * w / 4, h / 3, h - 2},
+          {w / 2, w / 2, h / 2, h / 2}};
+}
+
+// Everything a call produced (pixels, codes, values) in one 64-bit FNV-1a digest.
+class Digest {
+ public:
+  void add(const Pixels& px) { add(px.data(), px.size()); }
+  void add(const uint32_t* px, size_t n) {
+    mix(static_cast<uint64_t>(n));
+    mix(pfx::test::hash_pixels(px, n));
+  }
+  void add(int64_t value) { mix(static_cast<uint64_t>(value)); }
+  uint64_t value() const { return h_; }
+
+ private:
+  void mix(uint64_t v) {
+    for (int shift = 56; shift >= 0; shift -= 8) {
+      h_ ^= (v >> shift) & 0xFFu;
+      h_ *= 0x100000001B3ull;
+    }
+  }
+  uint64_t h_ = 0xCBF29CE484222325ull;
+};
 
 // Module variables as a fresh load has them, read before any test runs.
 const std::vector<int64_t> kInitialGlobals = [] {
@@ -70,13 +136,13 @@ void add_bytes(Digest& d, const uint8_t* b, size_t n) {
 // The usual inputs; the blur family adds one its working copy reduces by 4 per side (880 x 52),
 // and auto adjust one large enough for its tone curve.
 std::vector<Input> inputs_of(const cat::Export& e) {
-  std::vector<Input> v = pfx::test::conformance_inputs();
+  std::vector<Input> v = usual_inputs();
   if (pfx::test::works_reduced(e)) {
     v.push_back({"wide", 880, 52, pfx::test::random_image(880, 52, 2027),
                  pfx::test::random_mask(880, 52, 52)});
   }
   if (e.has(cat::kAutoParameters)) {
-    v.push_back(pfx::test::enlarged_photo_input(4));
+    v.push_back(photo_input(4));
     v.push_back({"noise 150", 150, 163, pfx::test::random_image(150, 163, 150),
                  pfx::test::random_mask(150, 163, 163)});
   }
@@ -87,8 +153,7 @@ std::vector<Input> inputs_of(const cat::Export& e) {
 // table covers.
 constexpr int32_t kOddSizes[][2] = {{1, 1}, {1, 9}, {7, 1}, {2, 2}, {3, 5}, {8200, 2}};
 
-cat::Args base(const cat::Export& e, const cat::Rep& rep, const Input& in, uint32_t* dst,
-               const uint32_t* texture) {
+cat::Args base(const cat::Rep& rep, const Input& in, uint32_t* dst, const uint32_t* texture) {
   cat::Args a;
   a.src = in.pixels.data();
   a.mask = in.mask.data();
@@ -98,7 +163,6 @@ cat::Args base(const cat::Export& e, const cat::Rep& rep, const Input& in, uint3
   a.height = in.height;
   for (int i = 0; i < 4; ++i) a.level[i] = rep.v[i];
   a.real = rep.real;
-  (void)e;
   return a;
 }
 
@@ -135,7 +199,7 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
   const Pixels texture = pfx::test::random_image(w, h, 99);
   Pixels out(in.pixels.size(), kUntouched);
   const auto fresh = [&] { out.assign(in.pixels.size(), kUntouched); };
-  cat::Args a = base(e, rep, in, out.data(), texture.data());
+  cat::Args a = base(rep, in, out.data(), texture.data());
   switch (e.shape) {
     case Shape::kFull:
     case Shape::kTextureFull: {
@@ -147,9 +211,9 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
     }
     case Shape::kPartial:
     case Shape::kTexturePartial:
-      for (const pfx::Rect& b : pfx::test::conformance_bounds(w, h)) {
+      for (const cat::Bounds& b : bounds_modes(w, h)) {
         fresh();
-        a.bounds = {b.left, b.right, b.top, b.bottom};
+        a.bounds = b;
         d.add(e.call(a)), d.add(out);
       }
       return;
@@ -207,9 +271,9 @@ void digest_image_call(Digest& d, const cat::Export& e, const cat::Rep& rep, con
       return;
     case Shape::kBlurInit:
     case Shape::kBlurPreview:
-      for (const pfx::Rect& b : pfx::test::conformance_bounds(w, h)) {
+      for (const cat::Bounds& b : bounds_modes(w, h)) {
         fresh();
-        a.bounds = {b.left, b.right, b.top, b.bottom};
+        a.bounds = b;
         if (e.shape == Shape::kBlurInit) {
           e.call(a), add_workspace(d);
         } else {
@@ -288,7 +352,7 @@ uint64_t digest_call(const cat::Export& e, const cat::Rep& rep) {
     for (const auto& s : kOddSizes) {
       const Input in{"odd", s[0], s[1], pfx::test::random_image(s[0], s[1], 7), {}};
       Pixels out(in.pixels.size(), kUntouched);
-      cat::Args a = base(e, rep, in, out.data(), in.pixels.data());
+      cat::Args a = base(rep, in, out.data(), in.pixels.data());
       d.add(e.call(a)), d.add(out);
     }
   }
@@ -366,7 +430,7 @@ std::vector<std::pair<std::string, uint64_t>> goldens_of(const cat::Export& e, s
     } else {
       Digest d;
       if (e.shape == Shape::kMirrorSize) {
-        for (const Input& in : pfx::test::conformance_inputs()) {
+        for (const Input& in : usual_inputs()) {
           for (int32_t pos : {0, 5, in.height - 1, in.width - 1, in.width}) {
             cat::Args a;
             a.width = in.width, a.height = in.height, a.pos = pos;
@@ -375,7 +439,7 @@ std::vector<std::pair<std::string, uint64_t>> goldens_of(const cat::Export& e, s
           }
         }
       } else if (e.shape == Shape::kRelease) {
-        const Input in = pfx::test::noise_input();
+        const Input in = noise_input();
         fx_Init_blur(in.pixels.data(), in.mask.data(), in.width, in.height, 1, 0, 0, 0);
         e.call({}), add_workspace(d);
         fx_init_tiltshift(in.pixels.data(), in.width, in.height);
@@ -409,7 +473,8 @@ class Conformance : public pfx::test::EveryPath {};
 
 TEST_P(Conformance, EveryExportAtEveryRepresentativeCallMatchesItsGolden) {
   const std::map<std::string, uint64_t> goldens = load_goldens();
-  const bool printing = pfx::test::printing_goldens();
+  const char* print = std::getenv("PHOTOFX_PRINT_GOLDENS");
+  const bool printing = print != nullptr && *print != '\0' && *print != '0';
   if (!printing) {
     ASSERT_FALSE(goldens.empty()) << "missing tests/data/goldens.txt";
   }
