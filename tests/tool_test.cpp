@@ -354,7 +354,7 @@ TEST_F(Tool, RefusedRunsSayWhyOnOneLineAndWriteNothing) {
        "mirror takes no selection (it changes the image's size)"},
       {1, "apply brightness D/missing.png OUT",
        "missing.png: cannot open: No such file or directory"},
-      {1, "apply brightness D/text.png OUT", "text.png: not a PNG or JPEG image"},
+      {1, "apply brightness D/text.png OUT", "text.png: not a PNG, JPEG, WebP or TIFF image"},
       {1, "apply brightness D/cut.png OUT", "cut.png: cannot decode PNG"},
       {1, "apply brightness --mask D/small.png IN OUT", "is 5x5 but the image is 23x17"},
       {1, "apply brightness --rect 23,0,5,5 IN OUT",
