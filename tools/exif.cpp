@@ -167,17 +167,23 @@ void orient_upright(Image& image, int32_t orientation) {
     return;
   }
   // Rotations and diagonal mirrors: the upright picture is h wide and w high, and its pixel
-  // (x, y) is the stored one at (sx, sy) below.
+  // (x, y) is the stored one at (sx, sy) below. Done in tiles, so that the columns read from
+  // the stored picture stay in the cache.
   Image upright;
   upright.resize(h, w);
-  for (int32_t y = 0; y < w; ++y) {
-    uint32_t* out = upright.row(y);
-    for (int32_t x = 0; x < h; ++x) {
-      int32_t sx = y, sy = x;                // 5: mirrored across the main diagonal
-      if (orientation == 6) sy = h - 1 - x;  // turned 90 degrees clockwise to view
-      if (orientation == 7) sx = w - 1 - y, sy = h - 1 - x;
-      if (orientation == 8) sx = w - 1 - y;  // turned 90 degrees anticlockwise to view
-      out[x] = image.at(sx, sy);
+  constexpr int32_t kTile = 64;
+  for (int32_t y0 = 0; y0 < w; y0 += kTile) {
+    for (int32_t x0 = 0; x0 < h; x0 += kTile) {
+      for (int32_t y = y0; y < std::min(w, y0 + kTile); ++y) {
+        uint32_t* out = upright.row(y);
+        for (int32_t x = x0; x < std::min(h, x0 + kTile); ++x) {
+          int32_t sx = y, sy = x;                // 5: mirrored across the main diagonal
+          if (orientation == 6) sy = h - 1 - x;  // turned 90 degrees clockwise to view
+          if (orientation == 7) sx = w - 1 - y, sy = h - 1 - x;
+          if (orientation == 8) sx = w - 1 - y;  // turned 90 degrees anticlockwise to view
+          out[x] = image.at(sx, sy);
+        }
+      }
     }
   }
   image = std::move(upright);
