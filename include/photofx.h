@@ -524,7 +524,9 @@ PHOTOFX_API int32_t runMirror(const uint32_t* src, int32_t src_width, int32_t sr
 /* ---- Sphericity and twirl --------------------------------------------------------------------
  * Both copy src to dst and warp the pixels of the window (left..right, top..bottom, clipped to
  * the image) that fall inside their circle around (cx, cy); warped pixels get alpha 255. A
- * non-zero `fast` computes every second pixel and fills 2 x 2 blocks, never beyond the window.
+ * non-zero `fast` computes every second pixel of every second row from the window's corner and
+ * fills the whole 2 x 2 block right of and below each: past an odd-sized window's last column
+ * or row by one, never beyond the image.
  * They return PHOTOFX_INVALID_ARGUMENT, writing nothing, for a null or overlapping buffer, a
  * centre outside the image or a radius, level or angle out of range. */
 
