@@ -288,7 +288,9 @@ PHOTOFX_API void make_gaussian_blur(const uint8_t* src, uint8_t* dst, const uint
 PHOTOFX_API void make_lens_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth,
                                 int32_t width, int32_t height, int32_t level);
 /* Scales a blurred sw x sh working image up into dst through the depth map; pixels with a
- * nonzero mask byte (every pixel while `all` is 1) are recomputed. dst may be src. */
+ * nonzero mask byte (every pixel while `all` is 1) are recomputed. dst may be src. A working
+ * side under 2 or over 2048 samples gives a copy of src; an sw x sh beyond 536,870,911 samples
+ * writes nothing. */
 PHOTOFX_API void run_blur(const uint32_t* src, const uint8_t* blur, const uint8_t* mask,
                           const uint8_t* depth, uint32_t* dst, int32_t width, int32_t height,
                           int32_t sw, int32_t sh);
@@ -315,7 +317,8 @@ PHOTOFX_API void fx_apply_tiltshift(const uint32_t* src, uint32_t* dst, int32_t 
 PHOTOFX_API void fx_destroy_tiltshift(void);
 /* The widest Gaussian blur of a working image, every sample counted. dst may be src. */
 PHOTOFX_API void make_tiltshift(const uint8_t* src, uint8_t* dst, int32_t width, int32_t height);
-/* Scales a blurred working image up and mixes it with src by each row's sharpness. */
+/* Scales a blurred working image up and mixes it with src by each row's sharpness; working
+ * sizes are treated as by run_blur. */
 PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uint32_t* dst,
                                    int32_t width, int32_t height, int32_t sw, int32_t sh,
                                    int32_t centre, int32_t half_height);
