@@ -34,8 +34,9 @@ extern "C" {
 
 /* ---- Memory wrappers: every allocation, fill and whole-image copy of the library ---------- */
 
-PHOTOFX_API void* fx_calloc(uint32_t count, uint32_t size); /* zero-filled; null on failure */
-PHOTOFX_API void* fx_malloc(uint32_t count, uint32_t size); /* null when count x size overflows */
+/* Both give null when count x size passes 32 bits, on every target; calloc's block is zeroed. */
+PHOTOFX_API void* fx_calloc(uint32_t count, uint32_t size);
+PHOTOFX_API void* fx_malloc(uint32_t count, uint32_t size);
 PHOTOFX_API void* fx_realloc(void* ptr, uint32_t size);
 PHOTOFX_API void fx_free(void* ptr);
 PHOTOFX_API void* fx_memset(void* ptr, int32_t value, uint32_t count);   /* returns ptr */
