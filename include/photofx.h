@@ -56,13 +56,17 @@ PHOTOFX_API extern const uint32_t LUT_DELTA2[256]; /* 60 x LUT_DELTA[i] */
 PHOTOFX_API void fx_rgb2hsv(int32_t r, int32_t g, int32_t b, int32_t* h, int32_t* s, int32_t* v);
 PHOTOFX_API void fx_hsv2rgb(int32_t h, int32_t s, int32_t v, int32_t* r, int32_t* g, int32_t* b);
 
-/* ---- Brightness and contrast: level 0..20, 10 leaves the image as it is ------------------- */
+/* ---- Brightness and contrast: level 0..20, 10 at the centre ------------------------------ */
 
+/* Adds (level - 10) x 10 to the luma. Every pixel makes a fixed-point YCbCr round trip, which
+ * leaves greys, black and white as they are but moves most colours by a step or two even at
+ * level 10 (0xFFFF0000 comes back as 0xFFFE0000). */
 PHOTOFX_API void controlBrightness(const uint32_t* src, uint32_t* dst, int32_t width,
                                    int32_t height, int32_t level);
 PHOTOFX_API void controlBrightnessPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                           int32_t width, int32_t height, int32_t level,
                                           int32_t left, int32_t right, int32_t top, int32_t bottom);
+/* Pushes each channel away from 128 above level 10, draws it toward 128 below; 10 keeps it. */
 PHOTOFX_API void controlContrast(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                  int32_t level);
 PHOTOFX_API void controlContrastPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
@@ -80,15 +84,16 @@ PHOTOFX_API void fx_control_contrast(const uint32_t* src, const uint8_t* mask, u
                                      int32_t width, int32_t height, int32_t level, int32_t left,
                                      int32_t right, int32_t top, int32_t bottom);
 
-/* ---- Saturation and temperature: level 0..20, 10 neutral ---------------------------------- */
+/* ---- Saturation and temperature: level 0..20, 10 at the centre --------------------------- */
 
-/* Level 0 is grey, 20 about doubles each colour's distance from grey. */
+/* Level 0 is grey, 10 keeps every pixel, 20 about doubles each colour's distance from grey. */
 PHOTOFX_API void controlSaturation(const uint32_t* src, uint32_t* dst, int32_t width,
                                    int32_t height, int32_t level);
 PHOTOFX_API void controlSaturationPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                           int32_t width, int32_t height, int32_t level,
                                           int32_t left, int32_t right, int32_t top, int32_t bottom);
-/* Above 10 warmer (less blue, more red), below 10 cooler. */
+/* Above 10 warmer (less blue, more red), below 10 cooler; at 10 no shift, but the YCbCr round
+ * trip of brightness still moves most colours by a step or two. */
 PHOTOFX_API void controlTemperature(const uint32_t* src, uint32_t* dst, int32_t width,
                                     int32_t height, int32_t level);
 PHOTOFX_API void controlTemperaturePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
