@@ -25,7 +25,8 @@ Image random_image(int32_t w, int32_t h, uint64_t seed, uint32_t alpha_bits = 0)
   Image img;
   img.width = w;
   img.height = h;
-  img.pixels = pfx::test::random_image(w, h, seed);
+  const pfx::test::Pixels px = pfx::test::random_image(w, h, seed);
+  img.pixels.assign(px.begin(), px.end());
   for (uint32_t& p : img.pixels) p |= alpha_bits;
   return img;
 }
@@ -88,10 +89,9 @@ TEST(ImageFiles, GreyAndSixteenBitPngsBecomeEightBitArgb) {
   write_raw_png(dir / "grey-alpha.png", 2, PNG_COLOR_TYPE_GRAY_ALPHA, 8, {200, 10, 50, 255});
   write_raw_png(dir / "rgb16.png", 1, PNG_COLOR_TYPE_RGB, 16, {0x12, 0xFF, 0xAB, 0x00, 0x01, 0x80});
   EXPECT_EQ(read_back(dir / "grey.png").pixels,
-            (std::vector<uint32_t>{0xFF000000u, 0xFF808080u, 0xFFFFFFFFu}));
-  EXPECT_EQ(read_back(dir / "grey-alpha.png").pixels,
-            (std::vector<uint32_t>{0x0AC8C8C8u, 0xFF323232u}));
-  EXPECT_EQ(read_back(dir / "rgb16.png").pixels, (std::vector<uint32_t>{0xFF12AB01u}));
+            (fxtool::Pixels{0xFF000000u, 0xFF808080u, 0xFFFFFFFFu}));
+  EXPECT_EQ(read_back(dir / "grey-alpha.png").pixels, (fxtool::Pixels{0x0AC8C8C8u, 0xFF323232u}));
+  EXPECT_EQ(read_back(dir / "rgb16.png").pixels, (fxtool::Pixels{0xFF12AB01u}));
 }
 
 TEST(ImageFiles, JpegDropsAlphaAndStaysClose) {

@@ -15,8 +15,10 @@
 #include "photofx.h"
 #include "support/files.h"
 #include "support/images.h"
+#include "catalog/params.h"
+#include "catalog/selection.h"
+#include "catalog/texture.h"
 #include "tools/image.h"
-#include "tools/texture.h"
 
 namespace {
 
@@ -33,7 +35,8 @@ Image photo(int32_t w, int32_t h, uint64_t seed) {
   Image img;
   img.width = w;
   img.height = h;
-  img.pixels = pfx::test::random_image(w, h, seed);
+  const pfx::test::Pixels px = pfx::test::random_image(w, h, seed);
+  img.pixels.assign(px.begin(), px.end());
   return img;
 }
 
@@ -172,7 +175,7 @@ TEST_F(Tool, EveryEffectMatchesTheLibraryWholeAndUnderASelection) {
       {{"old-photo"}, [](auto... a) { applyOldPhoto(a...); }},
       {{"old-photo-texture"},
        [](auto s, auto d, auto w, auto h) {
-         fx_apply_oldphoto_texture(s, d, fxtool::paper_texture(w, h).pixels.data(), w, h);
+         fx_apply_oldphoto_texture(s, d, fxcat::paper_texture(w, h).data(), w, h);
        }},
       {{"pop-art"}, [](auto... a) { applyPopArt(a...); }},
       {{"pop-art-preview"}, [](auto... a) { fx_apply_popart_prev(a...); }},
@@ -488,6 +491,43 @@ TEST_F(Tool, AutoAdjustParametersReachTheLibraryAndStayWithTheirPicture) {
       },
       big);
   EXPECT_EQ(decoded(out).pixels, expected.pixels);
+}
+
+// Hosts run an effect in place whenever its catalogue entry allows, to hold one picture in
+// memory: for every such entry, at every gallery setting, whole and under a selection, one
+// buffer must give what two give.
+TEST(Catalog, EffectsThatRunInPlaceGiveWhatTwoBuffersGive) {
+  const Image src = photo(kWidth, kHeight, 31);
+  fxcat::Selection sel;
+  fxcat::SelectionRequest rect;
+  rect.has_rect = true;
+  rect.rect = {3, 2, 9, 6};
+  ASSERT_EQ(fxcat::make_selection(rect, kWidth, kHeight, sel), "");
+  for (const fxcat::Effect& e : fxcat::effects()) {
+    if (!e.in_place || e.gallery == nullptr) continue;
+    for (std::string_view items = e.gallery;;) {
+      const std::string item(items.substr(0, items.find(';')));
+      SCOPED_TRACE(std::string(e.name) + " " + item);
+      fxcat::Settings settings;
+      fxcat::Values values;
+      ASSERT_EQ(fxcat::parse_settings(e, item, settings), "");
+      ASSERT_EQ(fxcat::resolve(e, settings, kWidth, kHeight, values), "");
+      const fxcat::Selection* const choices[] = {nullptr, &sel};
+      for (const fxcat::Selection* s : choices) {
+        if (fxcat::needs_two_buffers(e, s != nullptr)) continue;
+        Image two = src, one = src;
+        ASSERT_EQ(
+            fxcat::run_effect(e, values, src.pixels.data(), kWidth, kHeight, two.pixels.data(), s),
+            "");
+        ASSERT_EQ(
+            fxcat::run_effect(e, values, one.pixels.data(), kWidth, kHeight, one.pixels.data(), s),
+            "");
+        EXPECT_EQ(one.pixels, two.pixels) << (s != nullptr ? "under a selection" : "whole");
+      }
+      if (items.find(';') == std::string_view::npos) break;
+      items.remove_prefix(items.find(';') + 1);
+    }
+  }
 }
 
 }  // namespace

@@ -8,18 +8,24 @@
 #include <string>
 #include <vector>
 
+#include "catalog/effects.h"
+
 namespace fxtool {
+
+using fxcat::kMaxPixels;
+using fxcat::Pixels;
 
 // Pixels as the library takes them: 0xAARRGGBB words, row after row, no gap between rows.
 struct Image {
   int32_t width = 0;
   int32_t height = 0;
-  std::vector<uint32_t> pixels;
+  Pixels pixels;
 
+  // New pixels are left as they are: whoever resizes is about to write every one of them.
   void resize(int32_t w, int32_t h) {
     width = w;
     height = h;
-    pixels.assign(static_cast<size_t>(w) * static_cast<size_t>(h), 0);
+    pixels.resize(static_cast<size_t>(w) * static_cast<size_t>(h));
   }
   uint32_t& at(int32_t x, int32_t y) {
     return pixels[static_cast<size_t>(y) * static_cast<size_t>(width) + static_cast<size_t>(x)];
@@ -28,10 +34,6 @@ struct Image {
     return pixels[static_cast<size_t>(y) * static_cast<size_t>(width) + static_cast<size_t>(x)];
   }
 };
-
-// The library addresses at most this many pixels (its byte size must fit 32-bit counts); larger
-// files are refused before anything is allocated for them.
-constexpr int64_t kMaxPixels = INT32_MAX / 4;
 
 enum class FileFormat { kUnknown, kPng, kJpeg };
 

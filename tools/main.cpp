@@ -15,19 +15,25 @@
 #include <filesystem>
 #include <new>
 #include <set>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "tools/effect.h"
+#include "catalog/chain.h"
+#include "catalog/effects.h"
+#include "catalog/params.h"
 #include "tools/gallery.h"
 #include "tools/image.h"
-#include "tools/params.h"
 #include "tools/sample.h"
-#include "tools/selection.h"
 
 namespace fxtool {
 namespace {
+
+using fxcat::Effect;
+using fxcat::Param;
+using fxcat::Selects;
+using fxcat::Step;
 
 constexpr int kDone = 0;
 constexpr int kFailed = 1;
@@ -65,47 +71,6 @@ int usage_error(const std::string& message) {
   return kUsage;
 }
 
-// Splits "--name=value" or takes the next argument as the value.
-struct Arg {
-  std::string name;  // without dashes
-  std::string value;
-  bool has_value = false;
-};
-
-class ArgReader {
- public:
-  ArgReader(int argc, char** argv, int first) : args_(argv + first, argv + argc) {}
-
-  bool done() const { return pos_ >= args_.size(); }
-  const std::string& peek() const { return args_[pos_]; }
-  std::string next() { return args_[pos_++]; }
-
-  // The value of an option that needs one: after '=', else the following argument.
-  bool value_of(Arg& arg) {
-    if (arg.has_value) return true;
-    if (done()) return false;
-    arg.value = next();
-    arg.has_value = true;
-    return true;
-  }
-
- private:
-  std::vector<std::string> args_;
-  size_t pos_ = 0;
-};
-
-Arg split_option(const std::string& text) {
-  Arg a;
-  const size_t start = text.rfind("--", 0) == 0 ? 2 : 1;
-  const size_t eq = text.find('=');
-  a.name = text.substr(start, eq == std::string::npos ? std::string::npos : eq - start);
-  if (eq != std::string::npos) {
-    a.value = text.substr(eq + 1);
-    a.has_value = true;
-  }
-  return a;
-}
-
 bool is_option(const std::string& s) { return s.size() > 1 && s[0] == '-'; }
 
 // ---- list and help ----------------------------------------------------------------------------
@@ -113,18 +78,19 @@ bool is_option(const std::string& s) { return s.size() > 1 && s[0] == '-'; }
 std::string param_list(const Effect& e) {
   std::string s;
   for (size_t k = 0; k < e.param_count(); ++k) {
-    s += std::string(k == 0 ? "" : "  ") + "--" + e.params[k].name + " " + describe(e.params[k]);
+    s += std::string(k == 0 ? "" : "  ") + "--" + e.params[k].name + " " +
+         fxcat::describe(e.params[k]);
   }
   return s.empty() ? "(no parameters)" : s;
 }
 
 int list_effects() {
   size_t name_width = 0, family_width = 0;
-  for (const Effect& e : effects()) {
+  for (const Effect& e : fxcat::effects()) {
     name_width = std::max(name_width, std::string_view(e.name).size());
     family_width = std::max(family_width, std::string_view(e.family).size());
   }
-  for (const Effect& e : effects()) {
+  for (const Effect& e : fxcat::effects()) {
     std::printf("%-*s  %-*s  %s  - %s\n", static_cast<int>(name_width), e.name,
                 static_cast<int>(family_width), e.family, param_list(e).c_str(), e.summary);
   }
@@ -138,7 +104,7 @@ int help_effect(const Effect& e) {
     case Selects::kMask:
       std::printf("selection: edited by the library's partial variant\n");
       break;
-    case Selects::kByTool:
+    case Selects::kKeep:
       std::printf("selection: the whole image is edited, then only selected pixels are kept\n");
       break;
     case Selects::kNothing:
@@ -147,19 +113,19 @@ int help_effect(const Effect& e) {
   }
   for (size_t k = 0; k < e.param_count(); ++k) {
     const Param& p = e.params[k];
-    std::printf("  --%-12s %-24s %s\n", p.name, describe(p).c_str(), p.help);
+    std::printf("  --%-12s %-24s %s\n", p.name, fxcat::describe(p).c_str(), p.help);
   }
   if (e.gallery != nullptr) std::printf("gallery: %s\n", e.gallery);
   return kDone;
 }
 
-int help(ArgReader& args) {
+int help(fxcat::Words& args) {
   if (args.done()) {
     std::fputs(kUsageText, stdout);
     return kDone;
   }
   const std::string name = args.next();
-  const Effect* e = find_effect(name);
+  const Effect* e = fxcat::find_effect(name);
   if (e == nullptr) return usage_error("unknown effect '" + name + "' (photofx list shows them)");
   return help_effect(*e);
 }
@@ -180,94 +146,103 @@ std::string make_directory(const std::string& dir) {
   return {};
 }
 
-// Reads one input, applies the effect and writes the output. Returns the reason for failure,
-// naming the file it concerns.
-std::string apply_one(const Effect& effect, const Settings& settings,
-                      const SelectionOptions& request, const std::string& in_path,
-                      const std::string& out_path) {
-  Image in;
-  if (std::string err = read_image(in_path, in); !err.empty()) return in_path + ": " + err;
-  Selection selection;
-  if (request.any()) {
-    if (std::string err = make_selection(request, in.width, in.height, selection); !err.empty()) {
-      return in_path + ": " + err;
-    }
-  }
-  Values values;
-  if (std::string err = resolve(effect, settings, in.width, in.height, values); !err.empty()) {
-    return in_path + ": " + err;
-  }
-  Image out;
-  if (std::string err = run_effect(effect, values, in, request.any() ? &selection : nullptr, out);
-      !err.empty()) {
-    return in_path + ": " + effect.name + ": " + err;
-  }
-  if (std::string err = write_image(out_path, out); !err.empty()) return out_path + ": " + err;
+// A mask file selects a pixel whose grey value is at least this: grey is the luma
+// (77 R + 150 G + 29 B) / 256, scaled by alpha / 255 where the file has alpha.
+constexpr uint32_t kMaskThreshold = 128;
+
+bool mask_selects(uint32_t pixel) {
+  const uint32_t r = (pixel >> 16) & 0xFF, g = (pixel >> 8) & 0xFF, b = pixel & 0xFF;
+  const uint32_t grey = (77 * r + 150 * g + 29 * b) >> 8;
+  return grey * (pixel >> 24) >= kMaskThreshold * 255;
+}
+
+// A mask file, read once for every input, as the bytes a selection takes.
+struct MaskFile {
+  std::string path;
+  int32_t width = 0, height = 0;
+  std::vector<uint8_t> bytes;
+};
+
+std::string read_mask(const std::string& path, MaskFile& out) {
+  Image m;
+  if (std::string err = read_image(path, m); !err.empty()) return path + ": " + err;
+  out.path = path;
+  out.width = m.width;
+  out.height = m.height;
+  out.bytes.resize(m.pixels.size());
+  for (size_t i = 0; i < m.pixels.size(); ++i) out.bytes[i] = mask_selects(m.pixels[i]) ? 1 : 0;
   return {};
 }
 
-int apply(ArgReader& args) {
-  if (args.done()) return usage_error("apply needs an effect (photofx list shows them)");
-  const std::string name = args.next();
-  if (name == "--help" || name == "-h") {
+// The tool's own options among a chain's words.
+class ApplyOptions : public fxcat::ChainHost {
+ public:
+  std::string out_dir;
+  bool force_progress = false;
+  bool help = false;
+
+  bool option(size_t, fxcat::Option& opt, fxcat::Words& words, std::string& error) override {
+    if (opt.name == "help" || opt.word == "-h") {
+      help = true;
+      return true;
+    }
+    if (opt.word == "--progress") {
+      force_progress = true;
+      return true;
+    }
+    if (opt.word.rfind("--out-dir", 0) == 0 && opt.name == "out-dir") {
+      if (!words.take_value(opt)) {
+        error = "--out-dir needs a value";
+      } else if (!out_dir.empty()) {
+        error = "--out-dir is given twice";
+      } else if (opt.value.empty()) {
+        error = "--out-dir needs a directory";
+      } else {
+        out_dir = opt.value;
+      }
+      return true;
+    }
+    return false;
+  }
+
+  std::string effects_hint() const override { return " (photofx list shows them)"; }
+};
+
+// Reads one input, runs the chain and writes the output. Returns the reason for failure,
+// naming the file it concerns.
+std::string apply_one(const std::vector<Step>& steps, const std::string& in_path,
+                      const std::string& out_path) {
+  Image img;
+  if (std::string err = read_image(in_path, img); !err.empty()) return in_path + ": " + err;
+  if (std::string err = fxcat::run_chain(steps, img.pixels, img.width, img.height); !err.empty()) {
+    return in_path + ": " + err;
+  }
+  if (std::string err = write_image(out_path, img); !err.empty()) return out_path + ": " + err;
+  return {};
+}
+
+int apply(std::span<const std::string> words) {
+  ApplyOptions options;
+  std::vector<Step> steps;
+  const std::string err = fxcat::parse_chain(words, &options, steps);
+  if (options.help) {
+    if (steps.size() == 1 && steps[0].effect != nullptr) return help_effect(*steps[0].effect);
     std::fputs(kUsageText, stdout);
     return kDone;
   }
-  const Effect* effect = find_effect(name);
-  if (effect == nullptr)
-    return usage_error("unknown effect '" + name + "' (photofx list shows them)");
+  if (words.empty()) return usage_error("apply needs an effect (photofx list shows them)");
+  if (!err.empty()) return usage_error(err);
 
-  Settings settings;
-  SelectionOptions request;
-  std::string out_dir;
-  bool force_progress = false, options_done = false;
-  std::vector<std::string> files;
-  while (!args.done()) {
-    const std::string text = args.next();
-    if (options_done || !is_option(text)) {
-      files.push_back(text);
-      continue;
+  // File names come with the last step.
+  for (size_t i = 0; i + 1 < steps.size(); ++i) {
+    if (!steps[i].positional.empty()) {
+      return usage_error(fxcat::step_label(steps, i) + "unexpected '" + steps[i].positional[0] +
+                         "' (the files come after the last step)");
     }
-    if (text == "--") {
-      options_done = true;
-      continue;
-    }
-    Arg opt = split_option(text);
-    if (opt.name == "help" || text == "-h") return help_effect(*effect);
-    if (opt.name == "progress" && !opt.has_value) {
-      force_progress = true;
-      continue;
-    }
-    if (text.rfind("--", 0) != 0) return usage_error("unknown option " + text);
-    if (!args.value_of(opt)) return usage_error("--" + opt.name + " needs a value");
-    std::string err;
-    if (opt.name == "mask") {
-      if (request.has_mask) return usage_error("--mask is given twice");
-      request.has_mask = true;
-      request.mask_path = opt.value;
-    } else if (opt.name == "rect") {
-      if (request.has_rect) return usage_error("--rect is given twice");
-      request.has_rect = true;
-      err = parse_rect(opt.value, request.rect);
-    } else if (opt.name == "ellipse") {
-      if (request.has_ellipse) return usage_error("--ellipse is given twice");
-      request.has_ellipse = true;
-      err = parse_ellipse(opt.value, request.ellipse);
-    } else if (opt.name == "out-dir") {
-      if (!out_dir.empty()) return usage_error("--out-dir is given twice");
-      out_dir = opt.value;
-      if (out_dir.empty()) err = "--out-dir needs a directory";
-    } else {
-      err = set_param(*effect, opt.name, opt.value, settings);
-    }
-    if (!err.empty()) return usage_error(err);
   }
-
-  if (request.any() && effect->selects == Selects::kNothing) {
-    return usage_error(std::string(effect->name) +
-                       " takes no selection (it changes the image's size)");
-  }
+  const std::vector<std::string>& files = steps.back().positional;
   std::vector<std::pair<std::string, std::string>> jobs;  // input, output
+  const std::string& out_dir = options.out_dir;
   if (out_dir.empty()) {
     if (files.size() != 2) {
       return usage_error("apply needs IN and OUT, or --out-dir DIR and one or more inputs");
@@ -283,22 +258,36 @@ int apply(ArgReader& args) {
       jobs.emplace_back(in, out);
     }
   }
+  for (size_t i = 0; i < steps.size(); ++i) {
+    if (steps[i].selection.any() || !steps[i].mask_path.empty()) {
+      if (steps[i].effect->selects == Selects::kNothing) {
+        return usage_error(fxcat::step_label(steps, i) + steps[i].effect->name +
+                           " takes no selection (it changes the image's size)");
+      }
+    }
+  }
   for (const auto& job : jobs) {
     if (format_of_name(job.second) == FileFormat::kUnknown) {
       return usage_error(job.second + ": unknown image format (use .png, .jpg or .jpeg)");
     }
   }
-  const bool progress = force_progress || (!out_dir.empty() && isatty(STDERR_FILENO) != 0);
+  const bool progress = options.force_progress || (!out_dir.empty() && isatty(STDERR_FILENO) != 0);
 
-  if (request.has_mask) {
-    if (std::string err = read_image(request.mask_path, request.mask_image); !err.empty()) {
-      say(request.mask_path + ": " + err);
+  std::vector<MaskFile> masks(steps.size());
+  for (size_t i = 0; i < steps.size(); ++i) {
+    if (steps[i].mask_path.empty()) continue;
+    if (std::string e = read_mask(steps[i].mask_path, masks[i]); !e.empty()) {
+      say(e);
       return kFailed;
     }
+    steps[i].selection.mask = {.bytes = masks[i].bytes.data(),
+                               .width = masks[i].width,
+                               .height = masks[i].height,
+                               .name = masks[i].path};
   }
   if (!out_dir.empty()) {
-    if (std::string err = make_directory(out_dir); !err.empty()) {
-      say(err);
+    if (std::string e = make_directory(out_dir); !e.empty()) {
+      say(e);
       return kFailed;
     }
   }
@@ -309,9 +298,8 @@ int apply(ArgReader& args) {
       std::fprintf(stderr, "photofx: [%zu/%zu] %s -> %s\n", i + 1, jobs.size(),
                    jobs[i].first.c_str(), jobs[i].second.c_str());
     }
-    if (std::string err = apply_one(*effect, settings, request, jobs[i].first, jobs[i].second);
-        !err.empty()) {
-      say(err);
+    if (std::string e = apply_one(steps, jobs[i].first, jobs[i].second); !e.empty()) {
+      say(e);
       status = kFailed;
     }
   }
@@ -320,7 +308,7 @@ int apply(ArgReader& args) {
 
 // ---- gallery ----------------------------------------------------------------------------------
 
-int gallery(ArgReader& args) {
+int gallery(fxcat::Words& args) {
   std::string input, dir = "gallery", only;
   bool have_dir = false, have_only = false;
   while (!args.done()) {
@@ -330,14 +318,14 @@ int gallery(ArgReader& args) {
       input = text;
       continue;
     }
-    Arg opt = split_option(text);
+    fxcat::Option opt = fxcat::split_option(text);
     if (opt.name == "help" || text == "-h") {
       std::fputs(kUsageText, stdout);
       return kDone;
     }
     const bool is_dir = text == "-o" || opt.name == "out-dir";
     if (!is_dir && opt.name != "only") return usage_error("unknown option " + text);
-    if (!args.value_of(opt) || opt.value.empty()) return usage_error(text + " needs a value");
+    if (!args.take_value(opt) || opt.value.empty()) return usage_error(text + " needs a value");
     bool& have = is_dir ? have_dir : have_only;
     if (have) return usage_error(text + " is given twice");
     have = true;
@@ -346,13 +334,13 @@ int gallery(ArgReader& args) {
 
   std::vector<const Effect*> chosen;
   if (only.empty()) {
-    for (const Effect& e : effects()) chosen.push_back(&e);
+    for (const Effect& e : fxcat::effects()) chosen.push_back(&e);
   } else {
     std::string_view rest = only;
     while (true) {
       const size_t comma = rest.find(',');
       const std::string name(rest.substr(0, comma));
-      const Effect* e = find_effect(name);
+      const Effect* e = fxcat::find_effect(name);
       if (e == nullptr) return usage_error("unknown effect '" + name + "' in --only");
       chosen.push_back(e);
       if (comma == std::string_view::npos) break;
@@ -389,10 +377,11 @@ int run(int argc, char** argv) {
     return kUsage;
   }
   const std::string command = argv[1];
-  ArgReader args(argc, argv, 2);
+  const std::vector<std::string> words(argv + 2, argv + argc);
+  fxcat::Words args(words);
   if (command == "list")
     return args.done() ? list_effects() : usage_error("list takes no arguments");
-  if (command == "apply") return apply(args);
+  if (command == "apply") return apply(words);
   if (command == "gallery") return gallery(args);
   if (command == "help" || command == "--help" || command == "-h") return help(args);
   return usage_error("unknown command '" + command + "'");

@@ -1,24 +1,30 @@
-// The effect registry: what the command-line tool knows about each effect of the library.
+// The effect catalogue: every effect the hosts offer (the photofx tool, the Python module, the
+// web editor), described once.
 //
-// Every effect the tool offers is one entry of the table in tools/effects.cpp: its name on the
-// command line, its family, a one-line summary, how it takes a selection, its parameters (name,
-// range, default, help), a small function that calls the library, and the settings the gallery
-// shows. `photofx list`, `photofx apply` and `photofx gallery` are all driven by that table.
+// Each effect is one entry of the table in catalog/effects.cpp: its name, its family, a one-line
+// summary, how it takes a selection, whether it uses the library's module-wide state, whether it
+// may run in place, its parameters (name, kind, range, default, help), a small function that
+// calls the library on raw pixel buffers, and the settings a gallery shows. Nothing here reads
+// or writes files: a host brings pixels in whatever way suits it and calls run_effect.
 #pragma once
 
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
 #include <type_traits>
 #include <utility>
+#include <vector>
 
 #include "photofx.h"
-#include "tools/image.h"
 
-namespace fxtool {
+namespace fxcat {
+
+// The library addresses at most this many pixels (its byte sizes must fit 32-bit counts).
+constexpr int64_t kMaxPixels = INT32_MAX / 4;
 
 // Inclusive pixel bounds, in the order the library takes them.
 struct Bounds {
@@ -28,8 +34,17 @@ struct Bounds {
 // How an effect confines itself to a selection.
 enum class Selects : uint8_t {
   kMask,     // the library has a partial variant: the run function gets the mask and bounds
-  kByTool,   // the library edits whole images only: the tool keeps the unselected pixels
+  kKeep,     // the library edits whole images only: run_effect puts back the unselected pixels
   kNothing,  // the effect changes the image's size: a selection is refused
+};
+
+// Module-wide library state an effect uses. Effects with the same state must never run at the
+// same time in one process; run_effect takes a lock per state, so hosts with threads need do
+// nothing more.
+enum class State : uint8_t {
+  kNone,
+  kBlurWorkspace,  // the preview workspace shared by the blur and tilt-shift previews
+  kAutoAdjust,     // auto adjust's four parameters, read by auto adjust and downlight
 };
 
 // What an integer parameter's range is measured against. Positions and lengths depend on the
@@ -61,29 +76,28 @@ struct Param {
 };
 
 constexpr size_t kMaxParams = 6;
+// Parameter values in the entry's order: numbers as they are, choices as their library value.
 using Values = std::array<double, kMaxParams>;
 
-// Everything a run function needs. The tool has sized `out` like `in` and filled it with a copy
-// of `in`, so an effect that edits in place (the brushes) works on `out`; an effect that changes
-// the size resizes `out`.
+// Everything a run function needs. Same-size effects find the source already in `dst` (a copy,
+// or the very buffer when they run in place), so the brushes edit `dst`; effects that change the
+// size get a separate `dst` of out_width x out_height.
 struct Call {
-  const Image& in;
-  Image& out;
-  // Never null: for a whole-image call all ones, so library functions that read the mask
-  // whatever the bounds are still safe. Only kMask effects see a real selection.
+  const uint32_t* src;  // width x height; equal to dst when the effect runs in place
+  uint32_t* dst;
+  int32_t width, height;
+  int32_t out_width, out_height;
+  // Under a selection, for kMask effects: one byte per pixel, 1 where selected. Otherwise null
+  // (whole-image calls never read it).
   const uint8_t* mask;
   // The partial variant's bounds: the box around the selection, or left > right (the library's
   // whole-image mode) when there is none.
   Bounds bounds;
   // The box around the selection, or the whole image: for effects that take a window.
   Bounds window;
-  bool whole;  // no selection: call the full variant
+  bool whole;  // no selection (or a kKeep effect): call the full variant
   Values values;
 
-  const uint32_t* src() const { return in.pixels.data(); }
-  uint32_t* dst() const { return out.pixels.data(); }
-  int32_t width() const { return in.width; }
-  int32_t height() const { return in.height; }
   // Parameter k as an integer (ranges are checked before the call, so this is exact).
   int32_t arg(size_t k) const { return static_cast<int32_t>(values[k]); }
   double real(size_t k) const { return values[k]; }
@@ -91,15 +105,24 @@ struct Call {
 
 // Returns an empty string when the effect ran, otherwise what went wrong, in a few words.
 using Run = std::string (*)(const Call&);
+// For effects that change the size: the output's width and height for these values, or why
+// there is none.
+using Size = std::string (*)(const Values&, int32_t width, int32_t height, int32_t& out_width,
+                             int32_t& out_height);
 
 struct Effect {
   const char* name;
   const char* family;
   const char* summary;
   Selects selects;
+  State state = State::kNone;
+  // The run function gives the same pixels with src == dst as with two buffers (checked by the
+  // tool's tests for every entry that says so). Hosts then need only one image in memory.
+  bool in_place = true;
   std::array<Param, kMaxParams> params;
   Run run;
-  // Settings the gallery shows, one picture each, separated by ';'. Each is a comma-separated
+  Size size = nullptr;  // null: the output has the input's size
+  // Settings a gallery shows, one picture each, separated by ';'. Each is a comma-separated
   // list of NAME=VALUE overriding the defaults; an empty item is the defaults. Null: not shown.
   const char* gallery;
 
@@ -110,9 +133,56 @@ struct Effect {
   }
 };
 
-// The registry, in the order `photofx list` and the gallery show it.
+// The catalogue, in the order lists and galleries show it.
 std::span<const Effect> effects();
 const Effect* find_effect(std::string_view name);
+
+// ---- Running an effect on caller buffers ---------------------------------------------------
+
+// Pixel storage that is not zeroed when it grows: every buffer a host allocates for an image is
+// about to be overwritten by a decoder or an effect, and zeroing a large photograph first costs
+// as much as a simple effect.
+template <class T>
+struct NoInit : std::allocator<T> {
+  template <class U>
+  struct rebind {
+    using other = NoInit<U>;
+  };
+  NoInit() = default;
+  template <class U>
+  NoInit(const NoInit<U>&) noexcept {}
+  template <class U>
+  void construct(U* p) noexcept(std::is_nothrow_default_constructible_v<U>) {
+    ::new (static_cast<void*>(p)) U;
+  }
+  template <class U, class... A>
+  void construct(U* p, A&&... a) {
+    ::new (static_cast<void*>(p)) U(std::forward<A>(a)...);
+  }
+};
+using Pixels = std::vector<uint32_t, NoInit<uint32_t>>;
+
+// One byte per pixel, 1 where selected and 0 elsewhere, with the box around the selected
+// pixels (the whole image when none is selected, so the library's masked mode edits nothing).
+struct Selection {
+  std::vector<uint8_t> mask;
+  Bounds box;
+};
+
+// The output's size: the input's, or what a size-changing effect makes of it.
+std::string output_size(const Effect& effect, const Values& values, int32_t width, int32_t height,
+                        int32_t& out_width, int32_t& out_height);
+
+// Whether run_effect needs a destination separate from the source: for effects that change the
+// size or cannot run in place, and for kKeep effects under a selection (the unselected pixels
+// come back from the source).
+bool needs_two_buffers(const Effect& effect, bool selected);
+
+// Runs `effect` on `src` (width x height) into `dst`, which holds output_size's pixels; `dst`
+// may be `src` unless needs_two_buffers says otherwise. `selection` null: the whole image.
+// Effects that use module-wide state are serialised by a lock per state.
+std::string run_effect(const Effect& effect, const Values& values, const uint32_t* src,
+                       int32_t width, int32_t height, uint32_t* dst, const Selection* selection);
 
 // ---- Parameter constructors for the table ---------------------------------------------------
 
@@ -177,25 +247,23 @@ struct Arity<R (*)(A...)> {
 
 template <auto F, size_t... K>
 std::string call_full(const Call& c, std::index_sequence<K...>) {
-  if constexpr (std::is_void_v<decltype(F(c.src(), c.dst(), 0, 0, c.arg(K)...))>) {
-    F(c.src(), c.dst(), c.width(), c.height(), c.arg(K)...);
+  if constexpr (std::is_void_v<decltype(F(c.src, c.dst, 0, 0, c.arg(K)...))>) {
+    F(c.src, c.dst, c.width, c.height, c.arg(K)...);
     return {};
   } else {
-    return result_code(F(c.src(), c.dst(), c.width(), c.height(), c.arg(K)...));
+    return result_code(F(c.src, c.dst, c.width, c.height, c.arg(K)...));
   }
 }
 
 template <auto F, size_t... K>
 std::string call_partial(const Call& c, std::index_sequence<K...>) {
   const Bounds& b = c.bounds;
-  if constexpr (std::is_void_v<decltype(F(c.src(), c.mask, c.dst(), 0, 0, c.arg(K)..., 0, 0, 0,
-                                          0))>) {
-    F(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(K)..., b.left, b.right, b.top,
-      b.bottom);
+  if constexpr (std::is_void_v<decltype(F(c.src, c.mask, c.dst, 0, 0, c.arg(K)..., 0, 0, 0, 0))>) {
+    F(c.src, c.mask, c.dst, c.width, c.height, c.arg(K)..., b.left, b.right, b.top, b.bottom);
     return {};
   } else {
-    return result_code(F(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(K)..., b.left,
-                         b.right, b.top, b.bottom));
+    return result_code(
+        F(c.src, c.mask, c.dst, c.width, c.height, c.arg(K)..., b.left, b.right, b.top, b.bottom));
   }
 }
 
@@ -213,11 +281,11 @@ std::string full_and_partial(const Call& c) {
   return detail::call_partial<Partial>(c, std::make_index_sequence<levels>{});
 }
 
-// A full variant alone (the entry's selection is then kByTool).
+// A full variant alone (the entry's selection is then kKeep).
 template <auto Full>
 std::string full_only(const Call& c) {
   constexpr size_t levels = detail::Arity<decltype(Full)>::value - 4;
   return detail::call_full<Full>(c, std::make_index_sequence<levels>{});
 }
 
-}  // namespace fxtool
+}  // namespace fxcat
