@@ -130,8 +130,10 @@ TEST(AllocationFailure, WritesNothingLeaksNothingAndTheNextCallWorks) {
 // The wrappers themselves: a product beyond 32 bits and a refused request are null, and a
 // refused reallocation keeps the old block, which the caller still owns and frees.
 TEST(AllocationWrappers, RefusedRequestsGiveNullAndKeepTheOldBlock) {
-  EXPECT_EQ(fx_malloc(0x10000u, 0x10000u), nullptr);
-  EXPECT_EQ(fx_malloc(0x80000000u, 2u), nullptr);
+  for (const auto alloc : {fx_malloc, fx_calloc}) {
+    EXPECT_EQ(alloc(0x10000u, 0x10000u), nullptr);  // exactly 2^32 bytes
+    EXPECT_EQ(alloc(0x80000000u, 2u), nullptr);
+  }
   for (int64_t n : {1, 2}) {
     pfx::arm_allocation_failure(n);
     void* a = fx_malloc(4, 4);

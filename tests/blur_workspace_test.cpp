@@ -58,6 +58,19 @@ TEST(BlurReduction, ShiftAndScaleDown) {
   EXPECT_EQ(depth, before);
 }
 
+// A working size whose sample count no buffer could hold is refused by both compositing calls:
+// they write nothing (and read nothing of the small working image they are given).
+TEST(BlurComposite, WorkingSizesBeyondTheLimitWriteNothing) {
+  const Pixels src = pfx::test::random_image(24, 20, 10);
+  const Bytes blur(64 * 3, 0), depth(64, 1);
+  for (const auto& [sw, sh] : {std::pair{65536, 65536}, {INT32_MAX, 3}, {1, INT32_MAX}}) {
+    Pixels dst(src.size(), kUntouched);
+    run_blur(src.data(), blur.data(), nullptr, depth.data(), dst.data(), 24, 20, sw, sh);
+    restore_tiltshift(src.data(), blur.data(), dst.data(), 24, 20, sw, sh, 10, 2);
+    EXPECT_EQ(dst, Pixels(src.size(), kUntouched)) << sw << "x" << sh;
+  }
+}
+
 // The preview needs a blur workspace: none yet, destroyed (twice is harmless), or taken apart by
 // the tilt-shift's init (which releases the depth map too) or destroy (which leaves the depth
 // map to the blur's). A second init releases the first workspace (the leak checker would see it).

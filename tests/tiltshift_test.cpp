@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <iterator>
+#include <tuple>
 #include <vector>
 
 #include "frame/alloc_hook.h"

@@ -1,6 +1,6 @@
 // Twirl: the square-root and sine tables against <cmath>, the fixed points of the warp (angle 0,
-// the centre, the rim), the direction of the turn, the argument checks, fast mode's window, and
-// radii whose distances need more than 31 bits.
+// the centre, the rim), the direction of the turn, the argument checks, and radii whose distances
+// need more than 31 bits.
 #include <gtest/gtest.h>
 
 #include <cmath>
