@@ -507,6 +507,11 @@ inline constexpr Range kChannelValues[] = {{-2, 257, 1}};
 inline constexpr Range kColourGrid[] = {{0, 255, 7}};
 inline constexpr Range kWeightGrid[] = {{0, 2048, 97}, {2040, 2060, 1}};
 inline constexpr Range kPackGrid[] = {{-257, 300, 37}};
+// Every word around the ends of the 16.16 range, where the conversions saturate.
+inline constexpr Range kFixedEnds[] = {
+    {kMin, kMax, 0x1357F}, {0x7FFEFF00, 0x7FFF0100, 1}, {-0x7FFF0100, -0x7FFEFF00, 1}};
+// Hue, saturation and value all around zero: greys, black and the negative hue.
+inline constexpr Range kSmallAndZero[] = {{-300, 300, 7}, {-2, 2, 1}};
 inline constexpr Range kNone[] = {{0, 0, 1}};
 
 // ---- Row builders -------------------------------------------------------------------------------
@@ -553,7 +558,7 @@ inline constexpr Export kExports[] = {
     table("LUT_DELTA", LUT_DELTA),
     table("LUT_DELTA2", LUT_DELTA2),
     fn("fx_rgb2hsv", three_out<fx_rgb2hsv>, kRgbArgs, kColourGrid),
-    fn("fx_hsv2rgb", three_out<fx_hsv2rgb>, kHsvArgs, kSmallWords),
+    fn("fx_hsv2rgb", three_out<fx_hsv2rgb>, kHsvArgs, kSmallAndZero),
 
     // Brightness and contrast, saturation and temperature.
     row("controlBrightness", Shape::kFull, full<controlBrightness>, kSlider, kSliderReps, kEntry),
@@ -606,9 +611,9 @@ inline constexpr Export kExports[] = {
     fn("ftofix", to_fixed, kWord, kEveryWordSparsely, kErrorWord),
     fn("fixtof", from_fixed, kWord, kEveryWordSparsely),
     fn("itofix", value<itofix>, kWord, kSmallWords),
-    fn("fixtoi", value<fixtoi>, kWord, kEveryWordSparsely),
-    fn("fixfloor", value<fixfloor>, kWord, kEveryWordSparsely),
-    fn("fixceil", value<fixceil>, kWord, kEveryWordSparsely, kErrorWord),
+    fn("fixtoi", value<fixtoi>, kWord, kFixedEnds),
+    fn("fixfloor", value<fixfloor>, kWord, kFixedEnds),
+    fn("fixceil", value<fixceil>, kWord, kFixedEnds, kErrorWord),
     fn("fixadd", value<fixadd>, kTwoWords, kSmallWords, kErrorWord),
     fn("fixsub", value<fixsub>, kTwoWords, kSmallWords, kErrorWord),
     fn("fixmul", value<fixmul>, kTwoWords, kSmallWords, kErrorWord),
