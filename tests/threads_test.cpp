@@ -39,13 +39,13 @@ std::vector<Result> run_all(int32_t thread) {
       out.push_back({code, b.dst, b.work_out});
       continue;
     }
-    int64_t sum = 0;
+    uint64_t sum = 0;
     for (int32_t v = -70; v <= 70; ++v) {
       cat::Args a = b.args(e, pfx::test::typical(e));
       if (e.shape == cat::Shape::kValue) a.level[0] = a.level[1] = a.level[2] = v * 977;
-      sum = sum * 31 + e.call(a);
+      sum = sum * 31 + static_cast<uint64_t>(e.call(a));
     }
-    out.push_back({sum, {}, {}});
+    out.push_back({static_cast<int64_t>(sum), {}, {}});
   }
   return out;
 }
