@@ -359,6 +359,10 @@ uint64_t digest_call(const cat::Export& e, const cat::Rep& rep) {
   return d.value();
 }
 
+// An error word no call writes, so that a call that sets it (33 for a domain error, 34 for a
+// range error) or clears it shows.
+constexpr int32_t kUnwritten = 77;
+
 // A value function over one argument grid, with the error word each call leaves.
 uint64_t digest_range(const cat::Export& e, const cat::Range& r) {
   Digest d;
@@ -367,7 +371,7 @@ uint64_t digest_range(const cat::Export& e, const cat::Range& r) {
   int64_t at[4] = {r.lo, r.lo, r.lo, r.lo};
   for (;;) {
     for (int i = 0; i < 4; ++i) a.level[i] = static_cast<int32_t>(at[i]);
-    pfx::fix_error_word() = 34;
+    pfx::fix_error_word() = kUnwritten;
     d.add(e.call(a));
     if (e.has(cat::kErrorWord)) d.add(pfx::fix_error_word());
     int i = 0;
@@ -386,7 +390,7 @@ uint64_t digest_random(const cat::Export& e) {
     for (int i = 0; i < 4; ++i) {
       a.level[i] = static_cast<int32_t>(k % 4 == i ? rng.word() : rng.word() >> ((k + i) % 31));
     }
-    pfx::fix_error_word() = 34;
+    pfx::fix_error_word() = kUnwritten;
     d.add(e.call(a));
     if (e.has(cat::kErrorWord)) d.add(pfx::fix_error_word());
   }
