@@ -61,4 +61,19 @@ TEST(GaussianBlur, WorkedRowsColumnsAndTheDepthRule) {
   EXPECT_EQ(gaussian(row, {1, 1, 1, 1, 1, 2, 255, 2, 255}, 8), kept);
 }
 
+// Red-eye changes a pixel only where 2 x red > 5 x green, to about 0.05 R + 0.6 G + 0.3 B: on
+// the boundary itself the colour stays.
+TEST(Redeye, OnlyRedMoreThanTwoAndAHalfTimesGreenChanges) {
+  for (uint32_t g = 0; g < 103; ++g) {
+    for (uint32_t r : {5 * g / 2, 5 * g / 2 + 1}) {
+      if (r > 255) continue;
+      const uint32_t in = pfx::test::argb(0x3C, r, g, 9);
+      uint32_t p = in;
+      fx_remove_redeye(&p, 1, 1, 0, 0, 0);
+      const uint32_t red = (51 * r + 614 * g + 307 * 9) >> 10;
+      EXPECT_EQ(p, 2 * r > 5 * g ? pfx::test::argb(0x3C, red, g, 9) : in) << r << "," << g;
+    }
+  }
+}
+
 }  // namespace
