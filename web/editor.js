@@ -55,6 +55,8 @@ const ed = {
 function showBusy() {
   const busy = waiting.size > 0 || ed.previewPending;
   document.body.dataset.busy = busy ? '1' : '0';
+  // For scripts that time the page: the work asked for is done (drawn once this task ends).
+  if (!busy && !ed.previewing) document.dispatchEvent(new Event('photofx-idle'));
   $('status').textContent = busy ? 'working…' : ed.current ? `${ed.current.width} × ${ed.current.height}` : '';
 }
 
@@ -115,10 +117,6 @@ function showCurrent() {
 
 function findEffect(name) {
   return ed.effects.find((e) => e.name === name);
-}
-
-function hasSelection() {
-  return ed.rect !== null || ed.ellipse !== null || (ed.mask !== null && ed.mask.includes(1));
 }
 
 function extentOf(p, width, height) {
@@ -517,7 +515,7 @@ function paint(from, to) {
 function place(p) {
   if (!ed.effect) return;
   const col = ed.effect.params.find((q) => q.extent === 'width');
-  const row = ed.effect.params.find((q) => q.extent === 'height' && q.max < 0);
+  const row = ed.effect.params.find((q) => q.extent === 'height' && q.max === ed.current.height - 1);
   if (!col || !row) return;
   ed.values[col.name] = p.x;
   ed.values[row.name] = p.y;
