@@ -4,15 +4,16 @@
 // timed from the click that renders them. Prints "name<TAB>ms" lines.
 //
 //   node web-preview.mjs URL   (the page served from build/wasm/web)
-import { mkdtempSync } from 'node:fs';
+import { mkdtempSync, rmSync } from 'node:fs';
 import { tmpdir } from 'node:os';
 import { join } from 'node:path';
 import puppeteer from 'puppeteer-core';
 
+const profile = mkdtempSync(join(tmpdir(), 'photofx-chromium-'));
 const browser = await puppeteer.launch({
   executablePath: '/usr/bin/chromium',
   headless: true,
-  userDataDir: mkdtempSync(join(tmpdir(), 'photofx-chromium-')),
+  userDataDir: profile,
   args: ['--no-sandbox', '--disable-gpu', '--disable-background-networking', '--disable-component-update',
     '--disable-sync', '--no-first-run'],
 });
@@ -68,3 +69,4 @@ for (const name of names) {
   console.log(`${name}\t${ms.toFixed(1)}`);
 }
 await browser.close();
+rmSync(profile, { recursive: true, force: true });

@@ -5,7 +5,7 @@
 //   node browser_test.mjs WEB_DIR PHOTOFX_TOOL
 import { spawnSync } from 'node:child_process';
 import { createHash } from 'node:crypto';
-import { mkdtempSync, readFileSync, writeFileSync } from 'node:fs';
+import { mkdtempSync, readFileSync, rmSync, writeFileSync } from 'node:fs';
 import { createServer } from 'node:http';
 import { tmpdir } from 'node:os';
 import { extname, join, resolve } from 'node:path';
@@ -53,10 +53,11 @@ const server = createServer((req, res) => {
 });
 await new Promise((resolve) => server.listen(0, '127.0.0.1', resolve));
 
+const profile = mkdtempSync(join(tmpdir(), 'photofx-chromium-'));
 const browser = await puppeteer.launch({
   executablePath: '/usr/bin/chromium',
   headless: true,
-  userDataDir: mkdtempSync(join(tmpdir(), 'photofx-chromium-')),
+  userDataDir: profile,
   args: ['--no-sandbox', '--disable-gpu', '--disable-background-networking', '--disable-component-update',
     '--disable-sync', '--no-first-run'],
 });
@@ -149,6 +150,7 @@ try {
 } finally {
   await browser.close();
   server.close();
+  for (const dir of [work, profile]) rmSync(dir, { recursive: true, force: true });
 }
 console.log(`${passes} passed, ${failures} failed`);
 process.exit(failures === 0 && passes > 0 ? 0 : 1);
