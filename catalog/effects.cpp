@@ -654,10 +654,12 @@ std::string result_code(int32_t code) {
 
 namespace detail {
 
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
 // Below this a buffer takes ordinary pages; above it, 2 MB pages where Linux has them on
 // request (transparent huge pages in "madvise" mode, the common default).
 constexpr size_t kHugePage = size_t{2} << 20;
 constexpr size_t kHugeFrom = 4 * kHugePage;
+#endif
 
 void* allocate_pixels(size_t bytes) {
   void* p = nullptr;

@@ -278,7 +278,8 @@ async function applyEffect() {
 // A picture from the worker becomes the current one (after a step, an undo, a redo).
 async function arrive(r) {
   const resized = !ed.current || r.width !== ed.current.width || r.height !== ed.current.height;
-  ed.current = r;
+  ed.current = { pixels: r.pixels, width: r.width, height: r.height };
+  ed.previewScale = r.previewScale;
   if (resized) {
     ed.effects = (await ask('catalogue', { width: r.width, height: r.height })).catalogue.effects;
     clearSelection();

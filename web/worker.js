@@ -86,9 +86,14 @@ function pixelsOf(i) {
   return states[i].pixels;
 }
 
+// How many times smaller than the picture its working copy is.
+function scaleFor(width, height) {
+  return Math.max(1, Math.ceil(Math.sqrt((width * height) / kWorkPixels)));
+}
+
 // A box-filtered copy of the picture, small enough for previews at slider speed.
 function reduce(pixels, width, height) {
-  const scale = Math.max(1, Math.ceil(Math.sqrt((width * height) / kWorkPixels)));
+  const scale = scaleFor(width, height);
   if (scale === 1) return { pixels, width, height, scale };
   const w = Math.floor(width / scale);
   const h = Math.floor(height / scale);
@@ -137,7 +142,8 @@ function workingCopy() {
 }
 
 function answer(s) {
-  return { pixels: s.pixels.slice(0), width: s.width, height: s.height };
+  const previewScale = scaleFor(s.width, s.height);
+  return { pixels: s.pixels.slice(0), width: s.width, height: s.height, previewScale };
 }
 
 const ops = {
@@ -147,7 +153,7 @@ const ops = {
     states = [{ pixels, width, height, step: null, mask: null }];
     current = 0;
     workOf = -1;
-    return { catalogue: catalogue(width, height), previewScale: workingCopy().scale };
+    return { catalogue: catalogue(width, height), previewScale: scaleFor(width, height) };
   },
   // The catalogue for a picture of this size (the page asks after a step changes the size).
   catalogue({ width, height }) {
