@@ -5,6 +5,7 @@ through the client. Pillow reads and writes them; pixels go through the same cha
 command-line tool's (the catalogue's), so the outputs' pixels are the tool's.
 """
 
+import multiprocessing
 import os
 import sys
 import threading
@@ -217,6 +218,13 @@ def batch(
 
     owned = []
     if client is None:
+        if getattr(multiprocessing.current_process(), "_inheriting", False):
+            # A worker process starting up re-runs the main script: starting a cluster again
+            # there would never end.
+            raise RuntimeError(
+                "photofx.batch started a worker that called photofx.batch again: call it under "
+                "if __name__ == '__main__': in the main script"
+            )
         cluster = LocalCluster(
             n_workers=workers or os.cpu_count() or 1,
             threads_per_worker=1,

@@ -4,6 +4,7 @@ exports, photofx.lib); PHOTOFX_TOOL the command-line tool whose outputs batches 
 
 import hashlib
 import os
+import re
 import subprocess
 import threading
 
@@ -85,9 +86,21 @@ def pair(full, partial, *levels):
             lambda L, c: getattr(L, partial)(*c.part(*levels)))
 
 
-BRUSH = dict(cx=40, cy=30, radius=20)
-# effect: (its keywords, the C call of the whole image, the C call under a selection or None
-# when the package keeps the selected pixels of the whole image's result)
+def only(full, *levels):  # the package keeps the selected pixels of the whole image's result
+    return lambda L, c: getattr(L, full)(*c.full(*levels)), None
+
+
+def hdr(values, full, partial=None):
+    return (lambda L, c: tuned(L, values, lambda: getattr(L, full)(*c.full())),
+            partial and (lambda L, c: tuned(L, values, lambda: getattr(L, partial)(*c.part()))))
+
+
+def brush(fn, *levels):
+    return lambda L, c: getattr(L, fn)(c.dst, *levels), None
+
+
+B = dict(cx=40, cy=30, radius=20)
+# effect: (its keywords, the C call on the whole image, the C call under a selection)
 ROWS = {
     "brightness": ({"level": 14}, *pair("controlBrightness", "controlBrightnessPartial", 14)),
     "contrast": ({"level": 16}, *pair("controlContrast", "controlContrastPartial", 16)),
@@ -97,52 +110,55 @@ ROWS = {
     "hue": ({"level": 4}, *pair("controlHue", "controlHuePartial", 4)),
     "faded-colour": ({"level": 60}, *pair("controlFadedColour", "controlFadedColourPartial", 60)),
     "invert": ({}, *pair("applyInvert", "applyInvertPartial")),
-    "channel-gains": (dict(red=14, green=12, blue=4), *pair("controlAdjustRGB", "AdjustRGB", 14, 12, 4)),
-    "colour-tone": ({"hue": 200}, lambda L, c: L.fx_change_colortone(*c.full(200)), None),
-    "lighten": (dict(BRUSH, strength=100), lambda L, c: L.rubLighten(c.dst, 40, 30, c.w, c.h, 100, 20), None),
-    "darken": (dict(BRUSH, strength=90), lambda L, c: L.rubDarken(c.dst, 40, 30, c.w, c.h, 90, 20), None),
-    "blur": ({"level": 6}, lambda L, c: L.applyBlur(c.src, None, c.dst, c.w, c.h, 6, 1, 0, 1, 0),
+    "channel-gains": (dict(red=14, green=12, blue=4),
+                      *pair("controlAdjustRGB", "AdjustRGB", 14, 12, 4)),
+    "colour-tone": ({"hue": 200}, *only("fx_change_colortone", 200)),
+    "lighten": (dict(B, strength=100), *brush("rubLighten", 40, 30, W, H, 100, 20)),
+    "darken": (dict(B, strength=90), *brush("rubDarken", 40, 30, W, H, 90, 20)),
+    "blur": ({"level": 6}, lambda L, c: L.applyBlur(c.src, None, c.dst, W, H, 6, 1, 0, 1, 0),
              lambda L, c: L.applyBlur(*c.part(6))),
     "blur-preview": ({"level": 6}, lambda L, c: blur_preview(L, c, None, (1, 0, 1, 0)),
                      lambda L, c: blur_preview(L, c, c.mask, c.win)),
-    "tilt-shift": ({"centre": 30, "half_height": 8}, lambda L, c: L.applyTiltShift(*c.full(30, 8)), None),
+    "tilt-shift": ({"centre": 30, "half_height": 8}, *only("applyTiltShift", 30, 8)),
     "tilt-shift-preview": ({"centre": 30, "half_height": 8}, tilt, None),
-    "sharpen": ({}, lambda L, c: L.fx_apply_sharpen_all(*c.full()), lambda L, c: L.applySharpen(*c.part(0))),
-    "pixelize": ({"shift": 3}, lambda L, c: L.applyPixelize(*c.full(3)), None),
-    "pixelize-brush": (dict(BRUSH, shift=2), lambda L, c: L.rubPixelize(c.dst, c.w, c.h, 2, 40, 30, 20), None),
-    "red-eye": (BRUSH, lambda L, c: L.removeRedeye(c.dst, c.w, c.h, 40, 30, 20), None),
-    "gamma": (dict(channel="blue", gamma=1.8), lambda L, c: L.control_gamma(*c.full(3, 1.8)), None),
+    "sharpen": ({}, lambda L, c: L.fx_apply_sharpen_all(*c.full()),
+                lambda L, c: L.applySharpen(*c.part(0))),
+    "pixelize": ({"shift": 3}, *only("applyPixelize", 3)),
+    "pixelize-brush": (dict(B, shift=2), *brush("rubPixelize", W, H, 2, 40, 30, 20)),
+    "red-eye": (B, *brush("removeRedeye", W, H, 40, 30, 20)),
+    "gamma": (dict(channel="blue", gamma=1.8), *only("control_gamma", 3, 1.8)),
     "input-levels": (dict(channel="red", low=40, high=215),
-                     lambda L, c: L.changeHistogramByInput(*c.full(1, 40, 215)), None),
-    "output-levels": (dict(channel="green", low=40, high=215),
-                      lambda L, c: L.changeHistogramByOutput(*c.full(2, 40, 215)), None),
+                     *only("changeHistogramByInput", 1, 40, 215)),
+    "output-levels": (dict(channel="green", low=9, high=99),
+                      *only("changeHistogramByOutput", 2, 9, 99)),
     "greyscale": ({"level": 15}, *pair("controlGreyscale", "controlGreyscalePartial", 15)),
     "sepia": ({}, *pair("fx_apply_sepia", "fx_apply_sepia_partial")),
-    "vignette": ({}, lambda L, c: L.fx_apply_vignette(*c.full()), None),
-    "vignette-preview": ({}, lambda L, c: L.fx_apply_vignette_prev(*c.full()), None),
+    "vignette": ({}, *only("fx_apply_vignette")),
+    "vignette-preview": ({}, *only("fx_apply_vignette_prev")),
     "vintage": ({}, *pair("applyVintage", "applyVintagePartial")),
-    "vintage-preview": ({}, lambda L, c: L.fx_apply_vintage_prev(*c.full()), None),
+    "vintage-preview": ({}, *only("fx_apply_vintage_prev")),
     "old-photo": ({}, *pair("applyOldPhoto", "applyOldPhotoPartial")),
-    "old-photo-texture": ({}, lambda L, c: L.fx_apply_oldphoto_texture(c.src, c.dst, paper(c), c.w, c.h),
+    "old-photo-texture": ({},
+                          lambda L, c: L.fx_apply_oldphoto_texture(c.src, c.dst, paper(c), W, H),
                           lambda L, c: L.fx_apply_oldphoto_texture_partial(
-                              c.src, c.dst, paper(c), c.mask, c.w, c.h, *c.win)),
-    "pop-art": ({}, lambda L, c: L.applyPopArt(*c.full()), None),
-    "pop-art-preview": ({}, lambda L, c: L.fx_apply_popart_prev(*c.full()), None),
+                              c.src, c.dst, paper(c), c.mask, W, H, *c.win)),
+    "pop-art": ({}, *only("applyPopArt")),
+    "pop-art-preview": ({}, *only("fx_apply_popart_prev")),
     "soft-glow": ({"level": 80}, *pair("applySoftglow", "applySoftglowPartial", 80)),
     "retro": ({}, *pair("applyRetro", "applyRetroPartial")),
     "sunshine": ({}, *pair("applySunshine", "applySunshinePartial")),
     "downlight": (dict(threshold=50, cutoff=90, weight1=2000, weight2=5000),
-                  lambda L, c: tuned(L, (50, 90, 2000, 5000), lambda: L.applyDownlight(*c.full())),
-                  lambda L, c: tuned(L, (50, 90, 2000, 5000), lambda: L.applyDownlightPartial(*c.part()))),
+                  *hdr((50, 90, 2000, 5000), "applyDownlight", "applyDownlightPartial")),
     "bluewash": ({}, *pair("applyBluewash", "applyBluewashPartial")),
     "nostalgia": ({}, *pair("applyNostalgia", "applyNostalgiaPartial")),
     "yellow-glow": ({}, *pair("applyYellowglow", "applyYellowglowPartial")),
     "mirror": (dict(column=40, mode="keep-right"), mirror, None),
-    "sphericity": (dict(BRUSH, level=-60), lambda L, c: L.runSphericity(*c.full(40, 30, 20, -60), *c.win, 0), None),
-    "twirl": (dict(BRUSH, angle=-180, fast=True),
+    "sphericity": (dict(B, level=-60),
+                   lambda L, c: L.runSphericity(*c.full(40, 30, 20, -60), *c.win, 0), None),
+    "twirl": (dict(B, angle=-180, fast=True),
               lambda L, c: L.runTwirl(*c.full(40, 30, 20, -180), *c.win, 1), None),
     "auto-adjust": (dict(threshold=60, cutoff=85, weight1=4000),
-                    lambda L, c: tuned(L, (60, 85, 4000, 5120), lambda: L.applyAutoAdjust(*c.full())), None),
+                    *hdr((60, 85, 4000, 5120), "applyAutoAdjust")),
 }
 
 
@@ -169,7 +185,8 @@ def test_every_effect_equals_the_c_library(lib, name):
     assert digest(f(IMG, **kw, out=out)) == digest(want)
     assert digest(f(IMG.view(np.uint8).reshape(H, W, 4), **kw)) == digest(want.view(np.uint8))
     if f.__kwdefaults__.get("mask", 0) is None:  # it takes a selection
-        want = reference(lib, partial, SEL) if partial else np.where(SEL, reference(lib, full, SEL), IMG)
+        want = (reference(lib, partial, SEL) if partial
+                else np.where(SEL, reference(lib, full, SEL), IMG))
         out[...] = 0xA5A5A5A5
         assert digest(f(IMG, **kw, mask=SEL, out=out)) == digest(want), "under a selection"
 
@@ -190,45 +207,52 @@ def misaligned():
     return np.frombuffer(bytes(W * H * 4 + 1), np.uint8)[1:].reshape(H, W, 4)
 
 
+def overlapping(i, o):
+    flat = i.reshape(-1)
+    return photofx.brightness(flat[:-W].reshape(H - 1, W), out=flat[W:].reshape(H - 1, W))
+
+
+# (effect and its keywords (with the harness's out=), or a call of (img, out); error; message)
 BAD = [
-    (lambda i, o, m: photofx.brightness(i, level=21, out=o), ValueError, "level=21 is out of range 0..20"),
-    (lambda i, o, m: photofx.brightness(i, level=1.5, out=o), TypeError, "level must be an int, not float"),
-    (lambda i, o, m: photofx.brightness(i, level=True, out=o), TypeError, "level must be an int"),
-    (lambda i, o, m: photofx.twirl(i, cx=W, out=o), ValueError, f"cx={W} is out of range 0..{W - 1}"),
-    (lambda i, o, m: photofx.twirl(i, fast="yes", out=o), ValueError, "fast must be one of 'off', 'on'"),
-    (lambda i, o, m: photofx.gamma(i, gamma=float("nan"), out=o), ValueError, "gamma=nan is out of range"),
-    (lambda i, o, m: photofx.input_levels(i, low=200, high=100, out=o), ValueError, "high must be above low"),
-    (lambda i, o, m: photofx.mirror(i, mode="keep-top"), ValueError, "go with axis"),
-    (lambda i, o, m: photofx.brightness(i.T, out=o), ValueError, "img must be C-contiguous"),
-    (lambda i, o, m: photofx.brightness(i.astype(np.int32), out=o), TypeError, "not a int32 array"),
-    (lambda i, o, m: photofx.brightness(i.view(np.uint8), out=o), ValueError, "not a uint8 array of shape"),
-    (lambda i, o, m: photofx.brightness(photofx.to_pil(i), out=o), TypeError, "photofx.from_pil converts"),
-    (lambda i, o, m: photofx.brightness(misaligned()), ValueError, "aligned to 4 bytes"),
-    (lambda i, o, m: photofx.brightness(i, out=o[1:]), ValueError, f"out must be a uint32 array of shape ({H}, {W})"),
-    (lambda i, o, m: photofx.brightness(i, out=o.view(np.uint8).reshape(H, W, 4)), ValueError, "out must be a uint32"),
-    (lambda i, o, m: photofx.brightness(i, out=np.frombuffer(o.tobytes(), np.uint32).reshape(H, W)),
-     ValueError, "out must be writeable"),
-    (lambda i, o, m: photofx.brightness(i.reshape(-1)[:-W].reshape(H - 1, W), out=i.reshape(-1)[W:].reshape(H - 1, W)),
-     ValueError, "out overlaps img"),
-    (lambda i, o, m: photofx.twirl(i, out=i), ValueError, "out must not be img"),
-    (lambda i, o, m: photofx.brightness(i, mask=m[1:], out=o), ValueError, f"mask must have the image's shape ({H}, {W})"),
-    (lambda i, o, m: photofx.brightness(i, mask=m.astype(float), out=o), TypeError, "mask must be a bool or uint8 array"),
-    (lambda i, o, m: photofx.brightness(i, rect=(1, 2, 0, 3), out=o), ValueError, "width and height must be at least 1"),
-    (lambda i, o, m: photofx.brightness(i, rect=(1, 2, 3), out=o), TypeError, "rect must be four ints"),
-    (lambda i, o, m: photofx.brightness(i, ellipse=(-50, -50, 5, 5), out=o), ValueError, "lies outside"),
-    (lambda i, o, m: photofx.brightness(i, layout="argb", out=o), ValueError, "layout must be 'bgra' or 'rgba'"),
-    (lambda i, o, m: photofx.brightness(i, layout="rgba", out=o), TypeError, "R, G, B, A bytes"),
-    (lambda i, o, m: photofx.apply(i, "brightnes", level=3), ValueError, "unknown effect 'brightnes'"),
-    (lambda i, o, m: photofx.apply(i, "mirror", rect=(0, 0, 5, 5)), TypeError, "rect"),
+    ("brightness", dict(level=21), ValueError, "level=21 is out of range 0..20"),
+    ("brightness", dict(level=1.5), TypeError, "level must be an int, not float"),
+    ("brightness", dict(level=True), TypeError, "level must be an int, not bool"),
+    ("twirl", dict(cx=W), ValueError, f"cx={W} is out of range 0..{W - 1} for a {W} x {H} image"),
+    ("twirl", dict(fast="yes"), ValueError, "fast must be one of 'off', 'on', not 'yes'"),
+    ("gamma", dict(gamma=float("nan")), ValueError, "gamma=nan is out of range 0.1..10"),
+    ("input_levels", dict(low=200, high=100), ValueError, "high must be above low"),
+    ("brightness", dict(mask=SEL[1:]), ValueError, f"mask must have the image's shape ({H}, {W})"),
+    ("brightness", dict(mask=SEL * 1.0), TypeError, "mask must be a bool or uint8 array"),
+    ("brightness", dict(rect=(1, 2, 0, 3)), ValueError, "width and height must be at least 1"),
+    ("brightness", dict(rect=(1, 2, 3)), TypeError, "rect must be four ints"),
+    ("brightness", dict(ellipse=(-50, -50, 5, 5)), ValueError, "lies outside the 200x160 image"),
+    ("brightness", dict(layout="argb"), ValueError, "layout must be 'bgra' or 'rgba'"),
+    ("brightness", dict(layout="rgba"), TypeError, "must be a uint8 array (H, W, 4) of R, G, B, A"),
+    (lambda i, o: photofx.mirror(i, mode="keep-top"), None, ValueError, "keep-top and keep-bottom"),
+    (lambda i, o: photofx.invert(i.T, out=o), None, ValueError, "img must be C-contiguous"),
+    (lambda i, o: photofx.invert(i.astype(np.int32)), None, TypeError, "not a int32 array"),
+    (lambda i, o: photofx.invert(i.view(np.uint8)), None, ValueError, "not a uint8 array of shape"),
+    (lambda i, o: photofx.invert(photofx.to_pil(i)), None, TypeError, "photofx.from_pil converts"),
+    (lambda i, o: photofx.invert(misaligned()), None, ValueError, "img must be aligned to 4 bytes"),
+    (lambda i, o: photofx.invert(i, out=o[1:]), None, ValueError, f"array of shape ({H}, "),
+    (lambda i, o: photofx.invert(i, out=o.view(np.uint8)), None, ValueError, "out must be a uint32"),
+    (lambda i, o: photofx.invert(i, out=np.frombuffer(o.tobytes(), np.uint32).reshape(H, W)),
+     None, ValueError, "out must be writeable"),
+    (overlapping, None, ValueError, "out overlaps img"),
+    (lambda i, o: photofx.twirl(i, out=i), None, ValueError, "out must not be img"),
+    (lambda i, o: photofx.apply(i, "brightnes"), None, ValueError, "unknown effect 'brightnes'"),
 ]
 
 
-@pytest.mark.parametrize("call,error,message", BAD)
-def test_bad_arguments_raise_and_write_nothing(call, error, message):
-    img, out, mask = IMG.copy(), np.full((H, W), 0xA5A5A5A5, np.uint32), SEL.copy()
-    with pytest.raises(error, match=message.replace("(", r"\(").replace(")", r"\)").replace(".", r"\.")):
-        call(img, out, mask)
-    assert np.array_equal(img, IMG) and np.array_equal(mask, SEL) and (out == 0xA5A5A5A5).all()
+@pytest.mark.parametrize("effect,arguments,error,message", BAD)
+def test_bad_arguments_raise_and_write_nothing(effect, arguments, error, message):
+    img, out, selection = IMG.copy(), np.full((H, W), 0xA5A5A5A5, np.uint32), SEL.copy()
+    call = effect
+    if not callable(effect):
+        call = lambda i, o: getattr(photofx, effect)(i, out=o, **arguments)  # noqa: E731
+    with pytest.raises(error, match=re.escape(message)):
+        call(img, out)
+    assert np.array_equal(img, IMG) and np.array_equal(SEL, selection) and (out == 0xA5A5A5A5).all()
 
 
 def test_threads_never_corrupt_the_module_state():
@@ -241,7 +265,8 @@ def test_threads_never_corrupt_the_module_state():
         lambda i: photofx.tilt_shift_preview(i, centre=40),
     ]
     want = [[digest(job(i)) for job in jobs] for i in images]
-    previews = [[digest(photofx.blur_preview(i, level=v, mask=SEL)) for v in range(9)] for i in images]
+    previews = [[digest(photofx.blur_preview(i, level=v, mask=SEL)) for v in range(9)]
+                for i in images]
     wrong = []
 
     def hammer(t):
@@ -271,6 +296,8 @@ def test_the_stubs_list_every_effect_as_the_catalogue_says():
 
 
 CHAIN = "brightness --level 13 , vintage --ellipse 100,80,60,40 , twirl --angle -90 --radius 50"
+STEPS = [("brightness", {"level": 13}), ("vintage", {"ellipse": (100, 80, 60, 40)}),
+         ("twirl", {"angle": -90, "radius": 50})]
 
 
 def test_a_cluster_batch_equals_the_serial_run_and_the_tool(tmp_path):
@@ -286,13 +313,13 @@ def test_a_cluster_batch_equals_the_serial_run_and_the_tool(tmp_path):
     tool = os.environ.get("PHOTOFX_TOOL")
     for r in results[:-1]:
         serial = str(tmp_path / ("serial-" + os.path.basename(r.input)))
-        photofx.apply_file(r.input, serial, [("brightness", {"level": 13}), ("vintage", {"ellipse": (100, 80, 60, 40)}),
-                                             ("twirl", {"angle": -90, "radius": 50})])
+        photofx.apply_file(r.input, serial, STEPS)
         assert open(r.output, "rb").read() == open(serial, "rb").read(), r.input
         if tool:
             mine = str(tmp_path / ("tool-" + os.path.basename(r.input)))
             subprocess.run([tool, "apply", *CHAIN.split(), r.input, mine], check=True, timeout=60)
-            assert np.array_equal(np.asarray(Image.open(mine)), np.asarray(Image.open(r.output))), r.input
+            same = np.array_equal(np.asarray(Image.open(mine)), np.asarray(Image.open(r.output)))
+            assert same, r.input
     with pytest.raises(ValueError, match="more than the limit of 1000 pixels"):
         photofx.apply_file(inputs[0], tmp_path / "x.png", CHAIN, max_pixels=1000)
     with pytest.raises(ValueError, match="step 2 .vintage.: vintage has no parameter --level"):
