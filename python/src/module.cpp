@@ -505,7 +505,34 @@ class Session {
     if (dst.begin() < in_.end() && in_.begin() < dst.end()) {
       value_error(fn_ + ": out must not share memory with the session's image");
     }
-    const py::gil_scoped_release unlocked;
+    {
+      const py::gil_scoped_release unlocked;
+      draw(values, dst.words());
+    }
+    return dst.array;
+  }
+
+  // Keeps the GIL (it may run while the interpreter shuts down): whoever holds the state lock
+  // has let the GIL go and does not take it back before letting the lock go, so this wait ends.
+  void close() {
+    if (!open_) return;
+    open_ = false;
+    const std::lock_guard<std::mutex> lock(g_state);
+    if (g_workspace_owner != id_) return;
+    if (blur_) {
+      fx_destroy_blur();
+    } else {
+      destroyTiltShift();
+    }
+    g_workspace_owner = 0;
+  }
+
+  bool closed() const { return !open_; }
+
+ private:
+  // One preview into `d`, making the working copies first unless they are this session's.
+  // Without the GIL.
+  void draw(const Values& values, uint32_t* d) {
     const std::lock_guard<std::mutex> lock(g_state);
     const uint32_t* src = in_.words();
     const int32_t w = in_.width, h = in_.height;
@@ -520,7 +547,6 @@ class Session {
       }
       g_workspace_owner = id_;
     }
-    uint32_t* d = dst.words();
     if (e_->writes != fxcat::Writes::kAll) std::memcpy(d, src, in_.size() * sizeof(uint32_t));
     if (blur_) {
       fx_make_blur_preview(src, mask, d, w, h, static_cast<int32_t>(values[0]));
@@ -532,26 +558,8 @@ class Session {
         }
       }
     }
-    return dst.array;
   }
 
-  void close() {
-    if (!open_) return;
-    open_ = false;
-    const py::gil_scoped_release unlocked;
-    const std::lock_guard<std::mutex> lock(g_state);
-    if (g_workspace_owner != id_) return;
-    if (blur_) {
-      fx_destroy_blur();
-    } else {
-      destroyTiltShift();
-    }
-    g_workspace_owner = 0;
-  }
-
-  bool closed() const { return !open_; }
-
- private:
   const Effect* e_;
   std::string fn_;
   bool blur_;
