@@ -203,8 +203,9 @@ TEST_F(Tool, EveryEffectMatchesTheLibraryWholeAndUnderASelection) {
 
 // Where a selection does more than cut out the whole-image result: a masked blur draws on the
 // selected pixels only, the blur preview builds its workspace from the mask, the warps take the
-// selection's box as their window (fast mode's blocks start at its corner), and mirror makes the
-// picture the size the library names for it.
+// selection's box as their window (fast mode's blocks start at its corner; those the library
+// fills one past it are not selected and keep the source), and mirror makes the picture the size
+// the library names for it.
 TEST_F(Tool, SelectionsReachTheLibraryAsMaskBoundsAndWindow) {
   const std::vector<uint8_t> mask = rect_mask();
   const uint8_t* m = mask.data();
@@ -221,12 +222,14 @@ TEST_F(Tool, SelectionsReachTheLibraryAsMaskBoundsAndWindow) {
               fx_make_blur_preview(s, m, d, w, h, 2);
               fx_destroy_blur();
             }).pixels);
+  const Image warped = lib(src, [](auto s, auto d, auto w, auto h) {
+    runSphericity(s, d, w, h, 8, 9, 6, -70, 2, 16, 3, 14, 1);
+  });
+  const auto in_box = [](int32_t x, int32_t y) { return x >= 2 && x <= 16 && y >= 3 && y <= 14; };
   EXPECT_EQ(apply({"sphericity", "--cx", "8", "--cy", "9", "--radius", "6", "--level", "-70",
                    "--fast", "on", "--rect", "2,3,15,12"})
                 .pixels,
-            lib(src, [](auto s, auto d, auto w, auto h) {
-              runSphericity(s, d, w, h, 8, 9, 6, -70, 2, 16, 3, 14, 1);
-            }).pixels);
+            where(src, warped, in_box).pixels);
 
   const auto mirrored = [&](int32_t pos, int32_t mode, int32_t axis) {
     Image o;
