@@ -103,13 +103,17 @@ def main():
     rng = np.random.default_rng(7)
     img = rng.integers(0, 2**32, (16, 16), dtype=np.uint32)
     out = np.empty_like(img)
-    brightness, lib = photofx.brightness, photofx.lib
+    bright, lib = photofx.brightness, photofx.lib
+    apply = photofx.apply
+    c = lib.controlBrightness
     small = measure(
         {
-            "photofx.brightness(img, level=14, out=out)": lambda: brightness(img, level=14, out=out),
-            "photofx.brightness(img, level=14)": lambda: brightness(img, level=14),
-            'photofx.apply(img, "brightness", level=14)': lambda: photofx.apply(img, "brightness", level=14),
-            "photofx.lib.controlBrightness (ctypes)": lambda: lib.controlBrightness(img, out, 16, 16, 14),
+            "photofx.brightness(img, level=14, out=out)": lambda: bright(img, level=14, out=out),
+            "photofx.brightness(img, level=14)": lambda: bright(img, level=14),
+            'photofx.apply(img, "brightness", level=14)': lambda: apply(
+                img, "brightness", level=14
+            ),
+            "photofx.lib.controlBrightness (ctypes)": lambda: c(img, out, 16, 16, 14),
         },
         a.rounds,
         20000,
@@ -118,9 +122,11 @@ def main():
     big_out = np.empty_like(big)
     large = measure(
         {
-            "C controlBrightness": lambda: lib.controlBrightness(big, big_out, 4000, 3000, 14),
-            "photofx.brightness(big, level=14, out=out)": lambda: brightness(big, level=14, out=big_out),
-            "photofx.brightness(big, level=14)": lambda: brightness(big, level=14),
+            "C controlBrightness": lambda: c(big, big_out, 4000, 3000, 14),
+            "photofx.brightness(big, level=14, out=out)": lambda: bright(
+                big, level=14, out=big_out
+            ),
+            "photofx.brightness(big, level=14)": lambda: bright(big, level=14),
         },
         a.rounds,
         5,

@@ -10,18 +10,20 @@ import glob
 import os
 import shutil
 
-from pybind11.setup_helpers import ParallelCompile, Pybind11Extension, build_ext, naive_recompile, no_recompile
+from pybind11.setup_helpers import ParallelCompile, Pybind11Extension, build_ext
+from pybind11.setup_helpers import naive_recompile, no_recompile
 from setuptools import setup
 from setuptools.command.build_py import build_py
 
 HERE = os.path.dirname(os.path.abspath(__file__))
 ROOT = os.path.dirname(HERE)
+FAMILIES = ("frame", "adjust", "blur", "looks", "fixmath", "warp", "auto")
 
 
 def sources():
     """The library's sources (every family folder), the catalogue's, and the module's."""
     found = []
-    for folder in ("frame", "adjust", "blur", "looks", "fixmath", "warp", "auto"):
+    for folder in FAMILIES:
         found += sorted(glob.glob(os.path.join(ROOT, folder, "*.cpp")))
     for name in ("effects", "params", "selection", "chain"):
         found.append(os.path.join(ROOT, "catalog", name + ".cpp"))
@@ -32,7 +34,7 @@ def sources():
 def headers():
     """Every header the sources include: the extension is rebuilt when one of them changes."""
     found = []
-    for folder in ("include", "frame", "adjust", "blur", "looks", "fixmath", "warp", "auto", "catalog"):
+    for folder in ("include", "catalog") + FAMILIES:
         found += glob.glob(os.path.join(ROOT, folder, "*.h"))
     return sorted(os.path.relpath(h, HERE) for h in found)
 

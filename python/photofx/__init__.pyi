@@ -1,7 +1,8 @@
-"""Type stubs of photofx, made from the effect catalogue by `python -m photofx._stubs`."""
+"""Type stubs of photofx, made from the catalogue by `python -m photofx._stubs`."""
 
 from os import PathLike
-from typing import Any, Iterable, List, Literal, NamedTuple, Optional, Sequence, Tuple, TypeVar, Union
+from typing import Any, Iterable, List, Literal, NamedTuple, Optional, Sequence, Tuple, TypeVar
+from typing import Union
 
 import numpy as np
 import numpy.typing as npt
@@ -37,7 +38,9 @@ def batch(
     progress: Optional[bool] = None,
     timeout: Optional[float] = None,
 ) -> List[FileResult]: ...
-def apply_file(input: _Path, output: _Path, steps: Union[str, Sequence[Any]], *, max_pixels: int = ...) -> None: ...
+def apply_file(
+    input: _Path, output: _Path, steps: Union[str, Sequence[Any]], *, max_pixels: int = ...
+) -> None: ...
 
 def brightness(img: _A, *, level: int = 10, mask: Optional[Mask] = None, rect: Optional[Box] = None, ellipse: Optional[Box] = None, out: Optional[_A] = None, layout: Literal["bgra", "rgba"] = "bgra") -> _A:
     """lighter or darker: moves the luma and keeps the colour"""
@@ -176,7 +179,12 @@ class BlurSession:
     """the same blur through a preview session, as an editor's slider runs it"""
     closed: bool
     def __init__(
-        self, img: npt.NDArray[Any], mask: Optional[Mask] = None, *, rect: Optional[Box] = None, ellipse: Optional[Box] = None
+        self,
+        img: npt.NDArray[Any],
+        mask: Optional[Mask] = None,
+        *,
+        rect: Optional[Box] = None,
+        ellipse: Optional[Box] = None,
     ) -> None: ...
     def preview(self, *, level: int = 4, out: Optional[npt.NDArray[Any]] = None) -> npt.NDArray[Any]: ...
     def close(self) -> None: ...
@@ -188,7 +196,12 @@ class TiltShiftSession:
     """the same tilt-shift through a preview session"""
     closed: bool
     def __init__(
-        self, img: npt.NDArray[Any], mask: Optional[Mask] = None, *, rect: Optional[Box] = None, ellipse: Optional[Box] = None
+        self,
+        img: npt.NDArray[Any],
+        mask: Optional[Mask] = None,
+        *,
+        rect: Optional[Box] = None,
+        ellipse: Optional[Box] = None,
     ) -> None: ...
     def preview(self, *, centre: Optional[int] = None, half_height: Optional[int] = None, out: Optional[npt.NDArray[Any]] = None) -> npt.NDArray[Any]: ...
     def close(self) -> None: ...

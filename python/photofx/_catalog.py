@@ -66,7 +66,7 @@ def _load():
                 option=p["name"],
                 kind=p["kind"],
                 default=p["default"],
-                range=p["describe"],
+                range=f"False or True ({p['default']})" if p["kind"] == "bool" else p["describe"],
                 help=p["help"],
                 choices=tuple(p.get("choices", ())),
             )
@@ -126,7 +126,8 @@ def keywords(effect, names, *, stubs=False):
     `names` ("level=10, mask=None, ..."); with annotations for the stubs."""
     parts = []
     for p in effect.params:
-        parts.append(f"{p.name}: {annotation(p)} = {p.default!r}" if stubs else f"{p.name}={p.default!r}")
+        typed = f": {annotation(p)} = " if stubs else "="
+        parts.append(f"{p.name}{typed}{p.default!r}")
     for n in names:
         default = '"bgra"' if n == "layout" else "None"
         parts.append(f"{n}: {_STUB_TYPES[n]} = {default}" if stubs else f"{n}={default}")
@@ -157,7 +158,8 @@ _SELECTION_NOTES = {
 }
 
 _COMMON = """out : numpy.ndarray, optional
-    the array to write, of the result's dtype and shape; img itself to edit in place{in_place}
+    the array to write, of the result's dtype and shape; img itself to edit in
+    place{in_place}
 layout : "bgra" or "rgba"
     "rgba" takes and gives R, G, B, A bytes, converting once on the way in and once out"""
 
@@ -182,7 +184,7 @@ def docstring(effect, *, session=False):
     if not session:
         if effect.selects != "nothing":
             lines.append(_SELECTION)
-        in_place = "" if effect.in_place else " (not for this effect: it reads img as it writes)"
+        in_place = "" if effect.in_place else " (not this effect: it reads img as it writes)"
         lines.append(_COMMON.format(in_place=in_place))
     else:
         lines.append("out : numpy.ndarray, optional\n    the array to write, like the image")

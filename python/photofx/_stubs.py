@@ -6,10 +6,11 @@ parameters' types, ranges and defaults; a test compares it with what this module
 
 from . import _catalog
 
-_HEAD = '''"""Type stubs of photofx, made from the effect catalogue by `python -m photofx._stubs`."""
+_HEAD = '''"""Type stubs of photofx, made from the catalogue by `python -m photofx._stubs`."""
 
 from os import PathLike
-from typing import Any, Iterable, List, Literal, NamedTuple, Optional, Sequence, Tuple, TypeVar, Union
+from typing import Any, Iterable, List, Literal, NamedTuple, Optional, Sequence, Tuple, TypeVar
+from typing import Union
 
 import numpy as np
 import numpy.typing as npt
@@ -45,7 +46,9 @@ def batch(
     progress: Optional[bool] = None,
     timeout: Optional[float] = None,
 ) -> List[FileResult]: ...
-def apply_file(input: _Path, output: _Path, steps: Union[str, Sequence[Any]], *, max_pixels: int = ...) -> None: ...
+def apply_file(
+    input: _Path, output: _Path, steps: Union[str, Sequence[Any]], *, max_pixels: int = ...
+) -> None: ...
 '''
 
 _SESSION = '''
@@ -53,7 +56,12 @@ class {name}:
     """{doc}"""
     closed: bool
     def __init__(
-        self, img: npt.NDArray[Any], mask: Optional[Mask] = None, *, rect: Optional[Box] = None, ellipse: Optional[Box] = None
+        self,
+        img: npt.NDArray[Any],
+        mask: Optional[Mask] = None,
+        *,
+        rect: Optional[Box] = None,
+        ellipse: Optional[Box] = None,
     ) -> None: ...
     def preview(self, *, {keywords}) -> npt.NDArray[Any]: ...
     def close(self) -> None: ...
@@ -67,7 +75,8 @@ def render():
     for e in _catalog.EFFECTS:
         keywords = _catalog.keywords(e, _catalog.extras(e), stubs=True)
         out.append(f'def {e.function}(img: _A, *, {keywords}) -> _A:\n    """{e.summary}"""\n')
-    for name, effect in (("BlurSession", "blur-preview"), ("TiltShiftSession", "tilt-shift-preview")):
+    sessions = (("BlurSession", "blur-preview"), ("TiltShiftSession", "tilt-shift-preview"))
+    for name, effect in sessions:
         e = _catalog.BY_NAME[effect]
         keywords = _catalog.keywords(e, (), stubs=True) + ", out: Optional[npt.NDArray[Any]] = None"
         out.append(_SESSION.format(name=name, doc=e.summary, keywords=keywords.lstrip(", ")))
