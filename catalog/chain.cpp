@@ -162,7 +162,7 @@ std::string parse_chain(std::span<const std::string> words, ChainHost* host,
     }
     if (cursor.done() || is_separator(cursor.peek())) {
       if (count < 2) return "no effect given";
-      return label(index, step) + "is empty" + kSeparatorHint;
+      return step_name(index, step) + " is empty" + kSeparatorHint;
     }
     const std::string& name = cursor.next();
     step.effect = find_effect(name);
@@ -178,7 +178,7 @@ std::string parse_chain(std::span<const std::string> words, ChainHost* host,
     steps.push_back(std::move(step));
     if (cursor.done()) break;
     cursor.next();  // the separator
-    if (cursor.done()) return label(index + 1, Step{}) + "is empty" + kSeparatorHint;
+    if (cursor.done()) return step_name(index + 1, Step{}) + " is empty" + kSeparatorHint;
   }
   return {};
 }

@@ -29,9 +29,9 @@ constexpr std::string_view kStepSeparator = ",";
 // Options the hosts keep for themselves; no effect parameter may take one of these names (the
 // catalogue checks its table against them when it is compiled).
 inline constexpr const char* kHostOptions[] = {
-    "mask",     "rect",   "ellipse", "out-dir",     "progress",   "help", "jobs", "j",
-    "quality",  "q",      "strip",   "auto-orient", "max-pixels", "only", "o",    "version",
-    "lossless", "format", "h"};
+    "mask", "rect", "ellipse", "out-dir",  "progress",    "help",
+    "jobs", "j",    "quality", "strip",    "auto-orient", "max-pixels",
+    "only", "o",    "version", "lossless", "format",      "h"};
 
 struct Step {
   const Effect* effect = nullptr;

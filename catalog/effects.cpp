@@ -2,6 +2,11 @@
 // means; the table is checked when it is compiled (names, ranges, defaults).
 #include "catalog/effects.h"
 
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
+#include <sys/mman.h>
+#endif
+
+#include <cstdlib>
 #include <cstring>
 #include <mutex>
 #include <string>
@@ -636,6 +641,33 @@ std::string result_code(int32_t code) {
       return "the library returned the unknown code " + std::to_string(code);
   }
 }
+
+// ---- Pixel memory ---------------------------------------------------------------------------
+
+namespace detail {
+
+// Below this a buffer takes ordinary pages; above it, 2 MB pages where Linux has them on
+// request (transparent huge pages in "madvise" mode, the common default).
+constexpr size_t kHugePage = size_t{2} << 20;
+constexpr size_t kHugeFrom = 4 * kHugePage;
+
+void* allocate_pixels(size_t bytes) {
+  void* p = nullptr;
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
+  if (bytes >= kHugeFrom) {
+    if (posix_memalign(&p, kHugePage, bytes) != 0) throw std::bad_alloc();
+    madvise(p, bytes, MADV_HUGEPAGE);  // a hint: without it the pages are merely small
+    return p;
+  }
+#endif
+  p = std::malloc(bytes == 0 ? 1 : bytes);
+  if (p == nullptr) throw std::bad_alloc();
+  return p;
+}
+
+void free_pixels(void* p, size_t) noexcept { std::free(p); }
+
+}  // namespace detail
 
 // ---- Running ------------------------------------------------------------------------------
 

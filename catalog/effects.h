@@ -11,7 +11,9 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstdint>
 #include <memory>
+#include <new>
 #include <span>
 #include <string>
 #include <string_view>
@@ -26,10 +28,11 @@ namespace fxcat {
 // The library addresses at most this many pixels (its byte sizes must fit 32-bit counts).
 constexpr int64_t kMaxPixels = INT32_MAX / 4;
 
-// Hosts that read image files refuse larger ones by default, from the size in the file's header
-// before anything is decoded: a small file can claim a huge picture. The tool and the Python
-// batch share it.
-constexpr int64_t kDefaultMaxPixels = 200'000'000;
+// The most pixels a host accepts from a file or an upload unless told otherwise: above every
+// camera's and phone's photograph (the largest sensors give 200 megapixels), below what a few
+// hostile files (a small PNG can declare 20000 x 20000) could make a service allocate. 4 bytes a
+// pixel: 1 GB at most for one picture.
+constexpr int64_t kDefaultMaxPixels = 250'000'000;
 
 // Inclusive pixel bounds, in the order the library takes them.
 struct Bounds {
@@ -155,9 +158,16 @@ const Effect* find_effect(std::string_view name);
 
 // ---- Running an effect on caller buffers ---------------------------------------------------
 
+namespace detail {
+// Memory for a large picture in huge pages where the system offers them (see effects.cpp).
+void* allocate_pixels(size_t bytes);
+void free_pixels(void* p, size_t bytes) noexcept;
+}  // namespace detail
+
 // Pixel storage that is not zeroed when it grows: every buffer a host allocates for an image is
 // about to be overwritten by a decoder or an effect, and zeroing a large photograph first costs
-// as much as a simple effect.
+// as much as a simple effect. Large buffers come in huge pages, which spares the first touch of
+// a photograph tens of thousands of page faults.
 template <class T>
 struct NoInit : std::allocator<T> {
   template <class U>
@@ -167,6 +177,11 @@ struct NoInit : std::allocator<T> {
   NoInit() = default;
   template <class U>
   NoInit(const NoInit<U>&) noexcept {}
+  T* allocate(size_t n) {
+    if (n > SIZE_MAX / sizeof(T)) throw std::bad_array_new_length();
+    return static_cast<T*>(detail::allocate_pixels(n * sizeof(T)));
+  }
+  void deallocate(T* p, size_t n) noexcept { detail::free_pixels(p, n * sizeof(T)); }
   template <class U>
   void construct(U* p) noexcept(std::is_nothrow_default_constructible_v<U>) {
     ::new (static_cast<void*>(p)) U;

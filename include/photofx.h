@@ -32,6 +32,12 @@ extern "C" {
 #define PHOTOFX_OUT_OF_MEMORY 40961    /* 0xA001: a scratch buffer could not be allocated */
 #define PHOTOFX_INVALID_ARGUMENT 40962 /* 0xA002: a null buffer or a level out of range */
 
+/* ---- Version of this header and the library built from it -------------------------------- */
+
+#define PHOTOFX_VERSION_MAJOR 0
+#define PHOTOFX_VERSION_MINOR 1
+#define PHOTOFX_VERSION_PATCH 0
+
 /* ---- Memory wrappers: every allocation, fill and whole-image copy of the library ---------- */
 
 /* Both give null when count x size passes 32 bits, on every target; calloc's block is zeroed. */

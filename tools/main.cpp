@@ -1,8 +1,8 @@
-// photofx: the library's effects on PNG and JPEG files.
+// photofx: the library's effects on PNG, JPEG, WebP and TIFF files.
 //
-//   photofx list                           every effect with its parameters
-//   photofx apply EFFECT [options] IN OUT  one effect on one file
-//   photofx gallery [IN] [-o DIR]          every effect on one photograph
+//   photofx list                                  every effect with its parameters
+//   photofx apply STEP [, STEP]... [options] IN OUT   a chain of effects on a file (apply.cpp)
+//   photofx gallery [IN] [-o DIR]                 every effect on one photograph
 //
 // Exit status: 0 when everything was done, 1 when a file could not be read, processed or
 // written (the other files of the run are still done), 2 for a bad command line. Every problem
@@ -23,46 +23,55 @@
 #include "catalog/chain.h"
 #include "catalog/effects.h"
 #include "catalog/params.h"
+#include "photofx.h"
+#include "tools/cli.h"
 #include "tools/gallery.h"
 #include "tools/image.h"
 #include "tools/sample.h"
 
 namespace fxtool {
-namespace {
 
-using fxcat::Effect;
-using fxcat::Param;
-using fxcat::Selects;
-using fxcat::Step;
-
-constexpr int kDone = 0;
-constexpr int kFailed = 1;
-constexpr int kUsage = 2;
-
-constexpr const char* kUsageText =
+const char* const kUsageText =
     "usage:\n"
-    "  photofx list\n"
-    "  photofx apply EFFECT [--PARAM VALUE]... [selection] IN OUT\n"
-    "  photofx apply EFFECT [--PARAM VALUE]... [selection] --out-dir DIR IN...\n"
+    "  photofx list                  every effect, its parameters and their ranges\n"
+    "  photofx help [EFFECT]         this text, or one effect explained\n"
+    "  photofx apply STEP [, STEP]... [options] IN OUT\n"
+    "  photofx apply STEP [, STEP]... [options] --out-dir DIR IN...\n"
     "  photofx gallery [IN] [-o DIR] [--only EFFECT,...]\n"
-    "  photofx help [EFFECT]\n"
+    "  photofx --version\n"
     "\n"
-    "Images are PNG or JPEG, read by content and written by the output's extension\n"
-    "(.png keeps alpha; .jpg and .jpeg drop it).\n"
+    "A STEP is an effect with its parameters (--level 13 or --level=13) and its\n"
+    "selection. Steps are separated by a lone ',' and run in order on the decoded\n"
+    "picture, which is encoded once at the end:\n"
+    "  photofx apply brightness --level 13 , contrast --level 12 ,\n"
+    "                vintage --ellipse 300,200,120,80 in.jpg out.jpg\n"
     "\n"
-    "selection (a pixel is edited when every option given selects it; none: the whole image):\n"
-    "  --mask FILE            greyscale image of the same size; grey 128 or more selects\n"
-    "                         (grey = (77 R + 150 G + 29 B) / 256, times alpha / 255)\n"
+    "selection (a pixel is edited when every option given selects it; none: all):\n"
     "  --rect X,Y,W,H         columns X..X+W-1, rows Y..Y+H-1\n"
     "  --ellipse CX,CY,RX,RY  centre and radii in pixels, edge included\n"
+    "  --mask FILE            an image of the same size: grey 128 or more selects\n"
+    "                         (grey = (77 R + 150 G + 29 B) / 256 x alpha / 255)\n"
     "\n"
+    "files: PNG, JPEG, WebP or TIFF, read by content, written by the extension of\n"
+    "OUT (.png, .jpg, .jpeg, .webp, .tif, .tiff). EXIF, ICC profile and XMP are\n"
+    "copied to the output.\n"
+    "  --quality N            JPEG and lossy WebP quality, 1..100 (92)\n"
+    "  --lossless             lossless WebP\n"
+    "  --strip                leave out EXIF, ICC profile and XMP\n"
+    "  --auto-orient          turn the picture upright by its EXIF orientation first\n"
+    "  --max-pixels N         refuse larger pictures unread (250000000)\n"
+    "\n"
+    "batches:\n"
     "  --out-dir DIR          write each IN to DIR under its own name\n"
-    "  --progress             a line per file even when stderr is not a terminal\n"
+    "  --format EXT           ... with this extension (png, jpg, webp, tif, ...)\n"
+    "  -j N, --jobs N         files at once (default: one per core)\n"
+    "  --progress             show progress even when stderr is not a terminal\n"
     "\n"
     "gallery: one PNG per effect setting, contact-sheet.png and index.html in DIR\n"
     "(default: gallery); without IN, the bundled sample photograph.\n"
     "\n"
-    "Exit status: 0 done, 1 a file could not be read, processed or written, 2 bad command line.\n";
+    "Exit status: 0 done, 1 a file could not be read, processed or written,\n"
+    "2 a bad command line.\n";
 
 void say(const std::string& message) { std::fprintf(stderr, "photofx: %s\n", message.c_str()); }
 
@@ -71,7 +80,58 @@ int usage_error(const std::string& message) {
   return kUsage;
 }
 
+std::string base_name(const std::string& path) {
+  const size_t slash = path.rfind('/');
+  return slash == std::string::npos ? path : path.substr(slash + 1);
+}
+
+std::string make_directory(const std::string& dir) {
+  std::error_code ec;
+  std::filesystem::create_directories(dir, ec);
+  if (ec) return dir + ": cannot create the directory: " + ec.message();
+  if (!std::filesystem::is_directory(dir, ec)) return dir + ": not a directory";
+  return {};
+}
+
+namespace {
+
+using fxcat::Effect;
+using fxcat::Param;
+using fxcat::Selects;
+
 bool is_option(const std::string& s) { return s.size() > 1 && s[0] == '-'; }
+
+// `text` in lines of at most `width` columns, broken at spaces; lines after the first are
+// indented by `indent`.
+std::string wrap(std::string_view text, size_t width, size_t indent, size_t column = 0) {
+  std::string out;
+  const size_t first = column;
+  while (!text.empty()) {
+    const size_t space = text.find(' ');
+    const std::string_view word = text.substr(0, space);
+    if (column > first && column + 1 + word.size() > width) {
+      out += '\n';
+      out.append(indent, ' ');
+      column = indent;
+    } else if (column > first) {
+      out += ' ';
+      ++column;
+    }
+    out += word;
+    column += word.size();
+    if (space == std::string_view::npos) break;
+    text.remove_prefix(space + 1);
+  }
+  return out;
+}
+
+int version() {
+  std::printf("photofx %s (the command-line tool)\n", PHOTOFX_TOOL_VERSION);
+  std::printf("libphotofx %d.%d.%d\n", PHOTOFX_VERSION_MAJOR, PHOTOFX_VERSION_MINOR,
+              PHOTOFX_VERSION_PATCH);
+  std::printf("%s\n", codec_versions().c_str());
+  return kDone;
+}
 
 // ---- list and help ----------------------------------------------------------------------------
 
@@ -98,27 +158,6 @@ int list_effects() {
   return kDone;
 }
 
-int help_effect(const Effect& e) {
-  std::printf("%s (%s): %s\n", e.name, e.family, e.summary);
-  switch (e.selects) {
-    case Selects::kMask:
-      std::printf("selection: edited by the library's partial variant\n");
-      break;
-    case Selects::kKeep:
-      std::printf("selection: the whole image is edited, then only selected pixels are kept\n");
-      break;
-    case Selects::kNothing:
-      std::printf("selection: none (the effect changes the image's size)\n");
-      break;
-  }
-  for (size_t k = 0; k < e.param_count(); ++k) {
-    const Param& p = e.params[k];
-    std::printf("  --%-12s %-24s %s\n", p.name, fxcat::describe(p).c_str(), p.help);
-  }
-  if (e.gallery != nullptr) std::printf("gallery: %s\n", e.gallery);
-  return kDone;
-}
-
 int help(fxcat::Words& args) {
   if (args.done()) {
     std::fputs(kUsageText, stdout);
@@ -128,182 +167,6 @@ int help(fxcat::Words& args) {
   const Effect* e = fxcat::find_effect(name);
   if (e == nullptr) return usage_error("unknown effect '" + name + "' (photofx list shows them)");
   return help_effect(*e);
-}
-
-// ---- apply ------------------------------------------------------------------------------------
-
-std::string base_name(const std::string& path) {
-  const size_t slash = path.rfind('/');
-  return slash == std::string::npos ? path : path.substr(slash + 1);
-}
-
-// Makes `dir` (and its parents) unless it exists.
-std::string make_directory(const std::string& dir) {
-  std::error_code ec;
-  std::filesystem::create_directories(dir, ec);
-  if (ec) return dir + ": cannot create the directory: " + ec.message();
-  if (!std::filesystem::is_directory(dir, ec)) return dir + ": not a directory";
-  return {};
-}
-
-// A mask file selects a pixel whose grey value is at least this: grey is the luma
-// (77 R + 150 G + 29 B) / 256, scaled by alpha / 255 where the file has alpha.
-constexpr uint32_t kMaskThreshold = 128;
-
-bool mask_selects(uint32_t pixel) {
-  const uint32_t r = (pixel >> 16) & 0xFF, g = (pixel >> 8) & 0xFF, b = pixel & 0xFF;
-  const uint32_t grey = (77 * r + 150 * g + 29 * b) >> 8;
-  return grey * (pixel >> 24) >= kMaskThreshold * 255;
-}
-
-// A mask file, read once for every input, as the bytes a selection takes.
-struct MaskFile {
-  std::string path;
-  int32_t width = 0, height = 0;
-  std::vector<uint8_t> bytes;
-};
-
-std::string read_mask(const std::string& path, MaskFile& out) {
-  Image m;
-  if (std::string err = read_image(path, m); !err.empty()) return path + ": " + err;
-  out.path = path;
-  out.width = m.width;
-  out.height = m.height;
-  out.bytes.resize(m.pixels.size());
-  for (size_t i = 0; i < m.pixels.size(); ++i) out.bytes[i] = mask_selects(m.pixels[i]) ? 1 : 0;
-  return {};
-}
-
-// The tool's own options among a chain's words.
-class ApplyOptions : public fxcat::ChainHost {
- public:
-  std::string out_dir;
-  bool force_progress = false;
-  bool help = false;
-
-  bool option(size_t, fxcat::Option& opt, fxcat::Words& words, std::string& error) override {
-    if (opt.name == "help" || opt.word == "-h") {
-      help = true;
-      return true;
-    }
-    if (opt.word == "--progress") {
-      force_progress = true;
-      return true;
-    }
-    if (opt.word.rfind("--out-dir", 0) == 0 && opt.name == "out-dir") {
-      if (!words.take_value(opt)) {
-        error = "--out-dir needs a value";
-      } else if (!out_dir.empty()) {
-        error = "--out-dir is given twice";
-      } else if (opt.value.empty()) {
-        error = "--out-dir needs a directory";
-      } else {
-        out_dir = opt.value;
-      }
-      return true;
-    }
-    return false;
-  }
-
-  std::string effects_hint() const override { return " (photofx list shows them)"; }
-};
-
-// Reads one input, runs the chain and writes the output. Returns the reason for failure,
-// naming the file it concerns.
-std::string apply_one(const std::vector<Step>& steps, const std::string& in_path,
-                      const std::string& out_path) {
-  Image img;
-  if (std::string err = read_image(in_path, img); !err.empty()) return in_path + ": " + err;
-  if (std::string err = fxcat::run_chain(steps, img.pixels, img.width, img.height); !err.empty()) {
-    return in_path + ": " + err;
-  }
-  if (std::string err = write_image(out_path, img); !err.empty()) return out_path + ": " + err;
-  return {};
-}
-
-int apply(std::span<const std::string> words) {
-  ApplyOptions options;
-  std::vector<Step> steps;
-  const std::string err = fxcat::parse_chain(words, &options, steps);
-  if (options.help) {
-    if (steps.size() == 1 && steps[0].effect != nullptr) return help_effect(*steps[0].effect);
-    std::fputs(kUsageText, stdout);
-    return kDone;
-  }
-  if (words.empty()) return usage_error("apply needs an effect (photofx list shows them)");
-  if (!err.empty()) return usage_error(err);
-
-  // File names come with the last step.
-  for (size_t i = 0; i + 1 < steps.size(); ++i) {
-    if (!steps[i].positional.empty()) {
-      return usage_error(fxcat::step_label(steps, i) + "unexpected '" + steps[i].positional[0] +
-                         "' (the files come after the last step)");
-    }
-  }
-  const std::vector<std::string>& files = steps.back().positional;
-  std::vector<std::pair<std::string, std::string>> jobs;  // input, output
-  const std::string& out_dir = options.out_dir;
-  if (out_dir.empty()) {
-    if (files.size() != 2) {
-      return usage_error("apply needs IN and OUT, or --out-dir DIR and one or more inputs");
-    }
-    jobs.emplace_back(files[0], files[1]);
-  } else {
-    if (files.empty()) return usage_error("apply --out-dir needs one or more inputs");
-    std::set<std::string> seen;
-    for (const std::string& in : files) {
-      const std::string out = out_dir + "/" + base_name(in);
-      if (!seen.insert(out).second)
-        return usage_error("two inputs would both be written to " + out);
-      jobs.emplace_back(in, out);
-    }
-  }
-  for (size_t i = 0; i < steps.size(); ++i) {
-    if (steps[i].selection.any() || !steps[i].mask_path.empty()) {
-      if (steps[i].effect->selects == Selects::kNothing) {
-        return usage_error(fxcat::step_label(steps, i) + steps[i].effect->name +
-                           " takes no selection (it changes the image's size)");
-      }
-    }
-  }
-  for (const auto& job : jobs) {
-    if (format_of_name(job.second) == FileFormat::kUnknown) {
-      return usage_error(job.second + ": unknown image format (use .png, .jpg or .jpeg)");
-    }
-  }
-  const bool progress = options.force_progress || (!out_dir.empty() && isatty(STDERR_FILENO) != 0);
-
-  std::vector<MaskFile> masks(steps.size());
-  for (size_t i = 0; i < steps.size(); ++i) {
-    if (steps[i].mask_path.empty()) continue;
-    if (std::string e = read_mask(steps[i].mask_path, masks[i]); !e.empty()) {
-      say(e);
-      return kFailed;
-    }
-    steps[i].selection.mask = {.bytes = masks[i].bytes.data(),
-                               .width = masks[i].width,
-                               .height = masks[i].height,
-                               .name = masks[i].path};
-  }
-  if (!out_dir.empty()) {
-    if (std::string e = make_directory(out_dir); !e.empty()) {
-      say(e);
-      return kFailed;
-    }
-  }
-
-  int status = kDone;
-  for (size_t i = 0; i < jobs.size(); ++i) {
-    if (progress) {
-      std::fprintf(stderr, "photofx: [%zu/%zu] %s -> %s\n", i + 1, jobs.size(),
-                   jobs[i].first.c_str(), jobs[i].second.c_str());
-    }
-    if (std::string e = apply_one(steps, jobs[i].first, jobs[i].second); !e.empty()) {
-      say(e);
-      status = kFailed;
-    }
-  }
-  return status;
 }
 
 // ---- gallery ----------------------------------------------------------------------------------
@@ -384,10 +247,54 @@ int run(int argc, char** argv) {
   if (command == "apply") return apply(words);
   if (command == "gallery") return gallery(args);
   if (command == "help" || command == "--help" || command == "-h") return help(args);
+  if (command == "--version" || command == "version") {
+    return args.done() ? version() : usage_error(command + " takes no arguments");
+  }
   return usage_error("unknown command '" + command + "'");
 }
 
 }  // namespace
+
+int help_effect(const fxcat::Effect& e) {
+  constexpr size_t kColumns = 80;
+  std::printf("%s\n",
+              wrap(std::string(e.name) + " (" + e.family + "): " + e.summary, kColumns, 2).c_str());
+  const char* how = "";
+  switch (e.selects) {
+    case Selects::kMask:
+      how = "edited by the library's partial variant";
+      break;
+    case Selects::kKeep:
+      how = "the whole picture is edited, then only the selected pixels are kept";
+      break;
+    case Selects::kNothing:
+      how = "none (the effect changes the picture's size)";
+      break;
+  }
+  std::printf("%s\n", wrap(std::string("selection: ") + how, kColumns, 2).c_str());
+  if (e.state != fxcat::State::kNone) {
+    std::printf("%s\n", wrap("uses the library's module-wide state: never runs at the same time "
+                             "as another effect that does",
+                             kColumns, 2)
+                            .c_str());
+  }
+  // "  --name RANGE" then the help, indented under it when the two do not fit on one line.
+  for (size_t k = 0; k < e.param_count(); ++k) {
+    const Param& p = e.params[k];
+    std::string head = std::string("  --") + p.name + " " + fxcat::describe(p);
+    constexpr size_t kHelpColumn = 40;
+    if (head.size() + 1 > kHelpColumn) {
+      head += "\n" + std::string(kHelpColumn, ' ');
+    } else {
+      head += std::string(kHelpColumn - head.size(), ' ');
+    }
+    std::printf("%s%s\n", head.c_str(), wrap(p.help, kColumns, kHelpColumn, kHelpColumn).c_str());
+  }
+  if (e.gallery != nullptr)
+    std::printf("%s\n", wrap(std::string("gallery: ") + e.gallery, kColumns, 2).c_str());
+  return kDone;
+}
+
 }  // namespace fxtool
 
 int main(int argc, char** argv) {
