@@ -18,11 +18,21 @@ import numpy as np
 from . import _catalog
 from . import _photofx as _ext
 
-# The tool's JPEG quality: outputs are pixel-identical to the tool's only with the same encoder
-# settings.
-JPEG_QUALITY = 92
+# The tool's quality for JPEG and lossy WebP: lossy outputs are pixel-identical to the tool's
+# only with the same encoder settings.
+QUALITY = 92
 
-_FORMATS = {".png": "PNG", ".jpg": "JPEG", ".jpeg": "JPEG"}
+_FORMATS = {
+    ".png": "PNG",
+    ".jpg": "JPEG",
+    ".jpeg": "JPEG",
+    ".webp": "WEBP",
+    ".tif": "TIFF",
+    ".tiff": "TIFF",
+}
+
+
+_NAMES = ", ".join(_FORMATS)
 
 
 class FileResult(NamedTuple):
@@ -114,11 +124,10 @@ def _write(words, path):
 
     fmt = _FORMATS[os.path.splitext(path)[1].lower()]
     image = Image.frombuffer("RGBA", (words.shape[1], words.shape[0]), words, "raw", "BGRA", 0, 1)
-    options = {}
-    if fmt == "JPEG":
-        image = image.convert("RGB")
-        options["quality"] = JPEG_QUALITY
-    elif bool(np.all((words >> 24) == 0xFF)):
+    options = {"quality": QUALITY} if fmt in ("JPEG", "WEBP") else {}
+    if fmt == "TIFF":
+        options["compression"] = "tiff_adobe_deflate"
+    if fmt == "JPEG" or bool(np.all((words >> 24) == 0xFF)):
         image = image.convert("RGB")  # as the tool: no alpha channel when it says nothing
     folder, name = os.path.split(path)
     # Written under a temporary name beside the target and renamed when complete, so a failure
@@ -154,7 +163,7 @@ def _task(input, output, words, max_pixels):
 def _output_path(input, out_dir):
     output = os.path.join(os.fspath(out_dir), os.path.basename(os.fspath(input)))
     if os.path.splitext(output)[1].lower() not in _FORMATS:
-        raise ValueError(f"{output}: unknown image format (use .png, .jpg or .jpeg)")
+        raise ValueError(f"{output}: unknown image format (use {_NAMES})")
     return output
 
 
@@ -163,7 +172,7 @@ def apply_file(input, output, steps, *, max_pixels=_ext.MAX_PIXELS):
     Raises ValueError or OSError when the file cannot be read, processed or written."""
     output = os.fspath(output)
     if os.path.splitext(output)[1].lower() not in _FORMATS:
-        raise ValueError(f"{output}: unknown image format (use .png, .jpg or .jpeg)")
+        raise ValueError(f"{output}: unknown image format (use {_NAMES})")
     _apply(os.fspath(input), output, chain_words(steps), max_pixels)
 
 

@@ -302,13 +302,14 @@ STEPS = [("brightness", {"level": 13}), ("vintage", {"ellipse": (100, 80, 60, 40
 
 def test_a_cluster_batch_equals_the_serial_run_and_the_tool(tmp_path):
     inputs = []
-    for name, mode in (("a.png", "RGBA"), ("b.png", "RGB"), ("c.jpg", "RGB"), ("d.png", "L")):
+    for name, mode in (("a.png", "RGBA"), ("b.webp", "RGB"), ("c.jpg", "RGB"), ("d.png", "L"),
+                       ("e.tif", "RGBA")):
         inputs.append(str(tmp_path / name))
         photofx.to_pil(picture(len(inputs), 180, 140) | 0x3F3F3F3F).convert(mode).save(inputs[-1])
     inputs.append(str(tmp_path / "broken.png"))
     open(inputs[-1], "wb").write(b"not a picture")
     results = photofx.batch(inputs, CHAIN, tmp_path / "out", workers=2, timeout=120, progress=False)
-    assert [r.error is None for r in results] == [True, True, True, True, False]
+    assert [r.error is None for r in results] == [True] * 5 + [False]
     assert "broken.png" in results[-1].error
     tool = os.environ.get("PHOTOFX_TOOL")
     for r in results[:-1]:
