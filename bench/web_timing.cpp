@@ -1,8 +1,8 @@
 // Times every effect of the catalogue the way the hosts run it (run_effect, at the first setting
 // its gallery shows): the full effect on a 12-megapixel picture and on a 1080 x 720 one, and
-// what a slider runs while it moves (preview_step) on the 1080 x 720 one. The same source is built natively (bench
-// preset) and for WebAssembly (wasm preset, run under node), so bench/wasm-report compares like
-// with like.
+// what a slider runs while it moves (preview_step) on the 1080 x 720 one. The same source is built
+// natively (bench preset) and for WebAssembly (wasm preset, run under node), so bench/wasm-report
+// compares like with like.
 //
 // Output: a line per effect, tab-separated: name, then milliseconds for full 12 MP, full
 // 1080 x 720 and preview 1080 x 720 (the median of the runs made in about a quarter second).
