@@ -629,6 +629,26 @@ const Effect* find_effect(std::string_view name) {
   return nullptr;
 }
 
+std::string preview_step(const Effect& effect) {
+  const size_t n = effect.param_count();
+  const Effect* p = find_effect(std::string(effect.name) + "-preview");
+  if (p != nullptr && p->param_count() == n) {
+    bool same = true;
+    for (size_t k = 0; k < n; ++k)
+      same = same && std::strcmp(effect.params[k].name, p->params[k].name) == 0;
+    if (same) return p->name;
+  }
+  for (size_t k = 0; k < n; ++k) {
+    const Param& q = effect.params[k];
+    if (std::strcmp(q.name, "fast") != 0 || q.kind != Kind::kChoice) continue;
+    for (int32_t i = 0; i < q.choice_count; ++i) {
+      if (std::strcmp(q.choices[i].label, "on") == 0)
+        return std::string(effect.name) + " --fast on";
+    }
+  }
+  return {};
+}
+
 std::string result_code(int32_t code) {
   switch (code) {
     case PHOTOFX_SUCCESS:
@@ -646,10 +666,12 @@ std::string result_code(int32_t code) {
 
 namespace detail {
 
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
 // Below this a buffer takes ordinary pages; above it, 2 MB pages where Linux has them on
 // request (transparent huge pages in "madvise" mode, the common default).
 constexpr size_t kHugePage = size_t{2} << 20;
 constexpr size_t kHugeFrom = 4 * kHugePage;
+#endif
 
 void* allocate_pixels(size_t bytes) {
   void* p = nullptr;

@@ -156,6 +156,12 @@ struct Effect {
 std::span<const Effect> effects();
 const Effect* find_effect(std::string_view name);
 
+// What an editor's slider runs while it moves, as the start of a step in the chain syntax: the
+// entry NAME-preview when the table has one with the same parameters (the blur and tilt-shift
+// workspaces, the vignette, vintage and pop-art previews), or the effect with "--fast on" (the
+// warps). Empty: the effect itself serves.
+std::string preview_step(const Effect& effect);
+
 // ---- Running an effect on caller buffers ---------------------------------------------------
 
 namespace detail {

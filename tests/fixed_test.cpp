@@ -105,11 +105,19 @@ TEST(Fixed, ResultsAndErrorWord) {
   EXPECT_EQ(fixtof(-1), -1.0 / 65536);
 }
 
-TEST(Fixed, ErrorWordStaysUntilOverwrittenAndIsPerThread) {
+TEST(Fixed, ErrorWordStaysUntilOverwritten) {
   err() = 0;
   fixadd(0x7FFFFFFF, 1);
   fixadd(1, 2);
   EXPECT_EQ(err(), kRange);  // a successful call does not clear it
+}
+
+TEST(Fixed, ErrorWordIsPerThread) {
+#if defined(__EMSCRIPTEN__) && !defined(__EMSCRIPTEN_PTHREADS__)
+  GTEST_SKIP() << "this WebAssembly build has one thread (the web editor runs the library in one "
+                  "worker); the native and ARM builds check the word per thread";
+#endif
+  fixadd(0x7FFFFFFF, 1);
   int32_t seen_by_other_thread = -1;
   std::thread([&] { seen_by_other_thread = pfx::fix_error_word(); }).join();
   EXPECT_EQ(seen_by_other_thread, 0);
