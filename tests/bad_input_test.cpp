@@ -85,9 +85,7 @@ TEST(BadInput, MissingBuffersAndImpossibleSizesWriteNothing) {
 TEST(BadInput, InputsStayUnwrittenRefusalsWriteNothingAndInPlaceMatches) {
   for (const cat::Export& e : cat::kExports) {
     if (!under_test(e)) continue;
-    const std::vector<cat::Rep> reps = e.reps.empty()
-                                           ? std::vector<cat::Rep>{cat::Rep{}}
-                                           : std::vector<cat::Rep>(e.reps.begin(), e.reps.end());
+    const std::span<const cat::Rep> reps = pfx::test::reps_of(e);
     for (const cat::Rep& rep : reps) {
       SCOPED_TRACE(std::string(e.name) + " at level " + std::to_string(rep.v[0]));
       Buffers b(kW, kH, 83);

@@ -424,9 +424,7 @@ std::vector<std::pair<std::string, uint64_t>> goldens_of(const cat::Export& e, s
     default:
       break;
   }
-  const std::vector<cat::Rep> reps = e.reps.empty()
-                                         ? std::vector<cat::Rep>{cat::Rep{}}
-                                         : std::vector<cat::Rep>(e.reps.begin(), e.reps.end());
+  const std::span<const cat::Rep> reps = pfx::test::reps_of(e);
   for (const cat::Rep& rep : reps) {
     uint64_t v = 0;
     if (pfx::test::is_image_call(e.shape)) {

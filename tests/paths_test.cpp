@@ -46,9 +46,7 @@ class Paths : public pfx::test::EveryPath {};
 TEST_P(Paths, EveryCallOnAwkwardSizesMatchesThePortablePath) {
   for (const cat::Export& e : cat::kExports) {
     if (!pfx::test::is_image_call(e.shape)) continue;
-    const std::vector<cat::Rep> reps = e.reps.empty()
-                                           ? std::vector<cat::Rep>{cat::Rep{}}
-                                           : std::vector<cat::Rep>(e.reps.begin(), e.reps.end());
+    const std::span<const cat::Rep> reps = pfx::test::reps_of(e);
     for (const cat::Rep& rep : reps) {
       for (const auto& s : kSizes) {
         const Output mine = run(e, rep, s[0], s[1], GetParam());

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <span>
 #include <vector>
 
 #include "catalog/exports.h"
@@ -115,5 +116,11 @@ struct Buffers {
 
 // The typical call's levels: the row's first representative call, or none.
 inline cat::Rep typical(const cat::Export& e) { return e.reps.empty() ? cat::Rep{} : e.reps[0]; }
+
+// The row's representative calls; one call without levels for a row that has none.
+inline std::span<const cat::Rep> reps_of(const cat::Export& e) {
+  static constexpr cat::Rep kNone[1] = {};
+  return e.reps.empty() ? std::span<const cat::Rep>(kNone) : e.reps;
+}
 
 }  // namespace pfx::test
