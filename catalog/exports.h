@@ -534,7 +534,9 @@ constexpr Export table(std::string_view name, const T (&t)[N]) {
 
 template <class T>
 constexpr Export global(std::string_view name, T& g, uint16_t needs = kWorkspace) {
-  return {name, Shape::kGlobal, nullptr, {}, {}, needs, {}, &g, 1, sizeof(T)};
+  // count 0 marks a pointer, whose value only says whether the workspace exists.
+  return {name,     Shape::kGlobal, nullptr, {}, {}, needs, {}, &g, std::is_pointer_v<T> ? 0u : 1u,
+          sizeof(T)};
 }
 
 constexpr uint16_t kCode = kReturnsCode;

@@ -106,8 +106,8 @@ const std::vector<int64_t> kInitialGlobals = [] {
   std::vector<int64_t> v;
   for (const cat::Export& e : cat::kExports) {
     if (e.shape != Shape::kGlobal) continue;
-    v.push_back(e.entry_size == 4 ? *static_cast<const int32_t*>(e.address)
-                                  : *static_cast<uint8_t* const*>(e.address) == nullptr);
+    v.push_back(e.count == 1 ? *static_cast<const int32_t*>(e.address)
+                             : *static_cast<uint8_t* const*>(e.address) == nullptr);
   }
   return v;
 }();
