@@ -48,10 +48,11 @@ struct Taps {
 // other tap in the window stands for the centre sample with weight 9, so the weight is 9..81
 // and the result the sum over the weight. All nine taps are summed in registers, and the loop
 // vectorises across the line (the outputs are __restrict, so they cannot move the inputs).
-PFX_VECTOR_CLONES void blur_line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
-                                 const uint8_t* c2, uint8_t* __restrict o0, uint8_t* __restrict o1,
-                                 uint8_t* __restrict o2) {
+void blur_line_loop(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
+                    const uint8_t* c2, uint8_t* __restrict o0, uint8_t* __restrict o1,
+                    uint8_t* __restrict o2) {
   const Taps t = taps;
+  PFX_NO_ALIAS_LOOP
   for (int32_t x = 0; x < n; ++x) {
     // Every sum fits 16 bits (channels at most 255 x 55, weights at most 55, counts at most
     // 9), and 16-bit lanes hold twice as many outputs per vector.
@@ -76,9 +77,15 @@ PFX_VECTOR_CLONES void blur_line(int32_t n, const Taps& taps, const uint8_t* c0,
   }
 }
 
+void blur_line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1, const uint8_t* c2,
+               uint8_t* o0, uint8_t* o1, uint8_t* o2) {
+  vector_paths([&] { blur_line_loop(n, taps, c0, c1, c2, o0, o1, o2); });
+}
+
 // Splits a row of red, green, blue samples into three channel rows, and joins them back.
-PFX_VECTOR_CLONES void split_row(const uint8_t* rgb, int32_t n, uint8_t* __restrict r,
-                                 uint8_t* __restrict g, uint8_t* __restrict b) {
+void split_row_loop(const uint8_t* rgb, int32_t n, uint8_t* __restrict r, uint8_t* __restrict g,
+                    uint8_t* __restrict b) {
+  PFX_NO_ALIAS_LOOP
   for (int32_t x = 0; x < n; ++x) {
     r[x] = rgb[3 * x];
     g[x] = rgb[3 * x + 1];
@@ -86,13 +93,22 @@ PFX_VECTOR_CLONES void split_row(const uint8_t* rgb, int32_t n, uint8_t* __restr
   }
 }
 
-PFX_VECTOR_CLONES void join_row(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n,
-                                uint8_t* __restrict rgb) {
+void split_row(const uint8_t* rgb, int32_t n, uint8_t* r, uint8_t* g, uint8_t* b) {
+  vector_paths([&] { split_row_loop(rgb, n, r, g, b); });
+}
+
+void join_row_loop(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n,
+                   uint8_t* __restrict rgb) {
+  PFX_NO_ALIAS_LOOP
   for (int32_t x = 0; x < n; ++x) {
     rgb[3 * x] = r[x];
     rgb[3 * x + 1] = g[x];
     rgb[3 * x + 2] = b[x];
   }
+}
+
+void join_row(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n, uint8_t* rgb) {
+  vector_paths([&] { join_row_loop(r, g, b, n, rgb); });
 }
 
 }  // namespace

@@ -203,8 +203,8 @@ struct TwirlRun {
 
 // Twirled values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
 // row dy below it, none of them in the disc where u < 8192.
-PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict src, int32_t dy,
-                                 int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
+void twirl_run_loop(const TwirlRun& run, const uint32_t* __restrict src, int32_t dy, int32_t dx0,
+                    int32_t step, int32_t n, uint32_t* __restrict out) {
   const int32_t width = run.width, height = run.height, cx = run.cx, cy = run.cy;
   const uint32_t radius = run.radius, inv_rr = run.inv_rr, turn = run.turn;
   const bool clockwise = run.clockwise;
@@ -226,6 +226,7 @@ PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict
     coord = neg ? centre - whole - 1 : centre + whole;
     f = neg ? 2048 - part - (exact ? 0 : 1) : part;
   };
+  PFX_NO_ALIAS_LOOP
   for (int32_t i = 0; i < n; ++i) {
     const int32_t dx = dx0 + step * i;
     const uint32_t ay = static_cast<uint32_t>(dx < 0 ? -dx : dx);
@@ -263,6 +264,11 @@ PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict
     axis(cy, h, ml, c, c_neg, sy, fy);
     out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
   }
+}
+
+void twirl_run(const TwirlRun& run, const uint32_t* src, int32_t dy, int32_t dx0, int32_t step,
+               int32_t n, uint32_t* out) {
+  vector_paths([&] { twirl_run_loop(run, src, dy, dx0, step, n, out); });
 }
 
 // First index i >= 0 with x0 + step * i >= x, for step 1 or 2.
