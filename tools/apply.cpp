@@ -257,7 +257,7 @@ int apply(std::span<const std::string> words) {
   const std::string err = fxcat::parse_chain(words, &options, steps);
   if (options.help) {
     if (steps.size() == 1) return help_effect(*steps[0].effect);
-    std::fputs(kUsageText, stdout);
+    std::fputs(usage_text().c_str(), stdout);
     return kDone;
   }
   if (!err.empty()) return usage_error(err);
@@ -343,7 +343,8 @@ int apply(std::span<const std::string> words) {
       .max_pixels = options.max_pixels,
       .strip = options.strip,
       .auto_orient = options.auto_orient,
-      .write = {.quality = options.quality != 0 ? static_cast<int>(options.quality) : 92,
+      .write = {.quality = options.quality != 0 ? static_cast<int>(options.quality)
+                                                : fxcat::kDefaultQuality,
                 .lossless = options.lossless}};
   const bool terminal = isatty(STDERR_FILENO) != 0;
   const Progress::Mode mode = terminal && (options.progress || !options.out_dir.empty())

@@ -18,9 +18,9 @@ import numpy as np
 from . import _catalog
 from . import _photofx as _ext
 
-# The tool's quality for JPEG and lossy WebP: lossy outputs are pixel-identical to the tool's
-# only with the same encoder settings.
-QUALITY = 92
+# The tool's quality for JPEG and lossy WebP, from the catalogue: lossy outputs are
+# pixel-identical to the tool's only with the same encoder settings.
+QUALITY = _ext.QUALITY
 
 _FORMATS = {
     ".png": "PNG",

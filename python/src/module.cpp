@@ -719,6 +719,7 @@ const std::string kSwap = "swap_red_blue";
 PYBIND11_MODULE(_photofx, m) {
   m.doc() = "The native half of photofx: the effect catalogue over numpy arrays.";
   m.attr("MAX_PIXELS") = fxcat::kDefaultMaxPixels;
+  m.attr("QUALITY") = fxcat::kDefaultQuality;
   m.attr("LIBRARY_MAX_PIXELS") = fxcat::kMaxPixels;
   m.def("catalog", &catalog,
         "Every effect with its parameters, as the command-line tool lists them.");
