@@ -8,7 +8,7 @@ importScripts('photofx.js');
 
 let fx = null; // the wasm module
 let ready = null; // resolves when fx is there
-// The slider drag the module holds (see preview), or null.
+// The slider drag the module holds (see previewOn), or null.
 let drag = null;
 
 function start() {
