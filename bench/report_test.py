@@ -173,6 +173,27 @@ class Results(unittest.TestCase):
                                     "bar\tb\t5\t2\tmissed"])
 
 
+class Arm(unittest.TestCase):
+    @staticmethod
+    def arm(counts):
+        """bench/arm-cost's JSON for one build at 640 x 480, counts per pixel of 100 pixels."""
+        return {"sizes": ["640x480"], "builds": {"armv7": {"640x480": {
+            key: {"insns": n * 100, "items": 100, "unit": "pixel"} for key, n in counts.items()}}}}
+
+    def test_partial_is_held_to_its_full_variant_and_full_never_above_partial(self):
+        arm = self.arm({"hue/full": 70, "hue/partial": 75, "sepia/full": 30,
+                        "sepia/partial": 20, "mirror/full": 9})
+        rows = {r.key: r for r in report.arm_rows(arm)[0]}
+        self.assertEqual((rows["hue/full"].goal["armv7"], rows["hue/full"].met["armv7"]),
+                         (80, True))
+        self.assertEqual((rows["hue/partial"].goal["armv7"], rows["hue/partial"].met["armv7"]),
+                         (74, False))
+        self.assertIsNone(rows["mirror/full"].goal["armv7"])
+        md = report.arm_markdown(arm)
+        self.assertIn("3 of 4 ARM goals met, 1 not met.", md)
+        self.assertIn("more than their partial variant: sepia (armv7: 30.0 against 20.0)", md)
+
+
 @unittest.skipUnless(os.environ.get("PHOTOFX_CHART"), "PHOTOFX_CHART names no chart program")
 class Chart(unittest.TestCase):
     GREEN, RED, INK = (0x2E, 0x9E, 0x4F), (0xD6, 0x45, 0x2F), (0x20, 0x20, 0x20)
