@@ -78,6 +78,47 @@ inline int16x4_t constants(int16_t a, int16_t b, int16_t c, int16_t d) {
   return vld1_s16(v);
 }
 
+// A 256-entry byte table laid out for lookup(): in each 32-entry segment the byte at 4i + j holds
+// entry 8j + i, so that one vld4 puts the segment's entries in order into four registers, as the
+// table instructions want them, without moving them about.
+struct LookupTable {
+  uint8_t bytes[256];
+};
+
+constexpr LookupTable lookup_table(const uint8_t (&t)[256]) {
+  LookupTable out{};
+  for (int32_t segment = 0; segment < 256; segment += 32) {
+    for (int32_t i = 0; i < 8; ++i) {
+      for (int32_t j = 0; j < 4; ++j) out.bytes[segment + 4 * i + j] = t[segment + 8 * j + i];
+    }
+  }
+  return out;
+}
+
+// table[idx] for n bytes of in (n a multiple of 32) into out, which may be in: eight segments of
+// 32 entries, each looked up by the index less the segment's start (an index outside a segment
+// leaves the result as it was). Thirty-two bytes a step share each segment's load.
+inline void look_up(const LookupTable& table, const uint8_t* in, uint8_t* out, size_t n) {
+  const uint8x8_t segment = vdup_n_u8(32);
+  for (size_t k = 0; k < n; k += 32) {
+    uint8x8_t idx[4] = {vld1_u8(in + k), vld1_u8(in + k + 8), vld1_u8(in + k + 16),
+                        vld1_u8(in + k + 24)};
+    uint8x8x4_t s = vld4_u8(table.bytes);
+    uint8x8_t res[4];
+    for (int32_t j = 0; j < 4; ++j) res[j] = vtbl4_u8(s, idx[j]);
+    for (int32_t part = 1; part < 8; ++part) {
+      s = vld4_u8(table.bytes + 32 * part);
+      for (int32_t j = 0; j < 4; ++j) {
+        idx[j] = vsub_u8(idx[j], segment);
+        // Left to itself GCC computes all eight offsets of every index at once and spills them.
+        asm("" : "+w"(idx[j]));
+        res[j] = vtbx4_u8(res[j], s, idx[j]);
+      }
+    }
+    for (int32_t j = 0; j < 4; ++j) vst1_u8(out + k + 8 * j, res[j]);
+  }
+}
+
 // A chain of rules on Rgb8, applied in order, as one block.
 template <class... Rules>
 struct Chain {

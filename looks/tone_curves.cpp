@@ -11,6 +11,7 @@
 #include "adjust/channel_map.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
+#include "looks/tone_curves.h"
 #include "photofx.h"
 
 namespace pfx {
@@ -56,16 +57,6 @@ void map_image(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height
   map_channels(map, src, dst, static_cast<size_t>(n));
 }
 
-// n / 255 to the power 1 / gamma, scaled back to 0..255 and rounded half up. The clamp is made in
-// double before the conversion, so a gamma of zero, a negative gamma or a NaN (whose products
-// may be infinite or NaN) still gives a byte: NaN reads as 0.
-int32_t gamma_entry(int32_t n, double gamma) {
-  const double t = std::pow(n / 255.0, 1.0 / gamma) * 255.0 + 0.5;
-  if (!(t >= 0.0)) return 0;
-  if (t >= 255.0) return 255;
-  return static_cast<int32_t>(t);
-}
-
 }  // namespace
 }  // namespace pfx
 
@@ -85,37 +76,31 @@ void control_gamma(const uint32_t* src, uint32_t* dst, int32_t width, int32_t he
 void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                             int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;  // no range to stretch; dst is left as it was
-  const int64_t scale = 261120 / (int64_t{high} - low);
+  const pfx::InputLevels curve(low, high);
   if (pfx::levels_by_arithmetic(low, high)) {
-    const int32_t s32 = static_cast<int32_t>(scale);
+    const int32_t s32 = static_cast<int32_t>(curve.scale);
     pfx::for_each_pixel(src, dst, width, height,
                         pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
                           return pfx::clamp_byte((s32 * (c - low)) >> 10);
                         }));
     return;
   }
-  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
-                   const int64_t v = (scale * (c - int64_t{low})) >> 10;
-                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                 }));
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, curve));
 }
 
 void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                              int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;
-  const int64_t scale = (int64_t{high} - low) * 1024 / 255;
+  const pfx::OutputLevels curve(low, high);
   if (pfx::levels_by_arithmetic(low, high)) {
-    const int32_t s32 = static_cast<int32_t>(scale);
+    const int32_t s32 = static_cast<int32_t>(curve.scale);
     pfx::for_each_pixel(src, dst, width, height,
                         pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
                           return pfx::clamp_byte(((s32 * c) >> 10) + low);
                         }));
     return;
   }
-  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
-                   const int64_t v = ((scale * c) >> 10) + low;
-                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                 }));
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, curve));
 }
 
 }  // extern "C"
