@@ -17,4 +17,6 @@ PFX_NEON_KERNEL(size_t nostalgia(const Run&))
 PFX_NEON_KERNEL(size_t yellowglow(const Run&))
 PFX_NEON_KERNEL(size_t downlight_tail(const Run&))
 
+PFX_NEON_KERNEL(size_t sepia(const Run&))
+
 }  // namespace pfx::neon

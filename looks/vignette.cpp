@@ -52,18 +52,33 @@ void fx_apply_vignette(const uint32_t* src, uint32_t* dst, int32_t width, int32_
     pfx::for_each_pixel(src, dst, width, height, [](uint32_t p) { return p; });
     return;
   }
-  if (pfx::pixel_count(width, height) > pfx::kMaxPixels) return;
+  if (src == nullptr || dst == nullptr || pfx::pixel_count(width, height) > pfx::kMaxPixels) {
+    return;
+  }
   const pfx::DividedVignette vignette(width, height);
-  pfx::for_each_pixel_weighted(src, dst, width, height, vignette, [](uint32_t p, uint32_t w) {
-    return pfx::scale_pixel(p, static_cast<int32_t>(w), pfx::DividedVignette::kShift);
-  });
+  pfx::for_each_pixel_weighted(
+      src, nullptr, dst, width, height, vignette,
+      [](uint32_t p, uint32_t w) {
+        return pfx::scale_pixel(p, static_cast<int32_t>(w), pfx::DividedVignette::kShift);
+      },
+      [&](const pfx::Run& run, int32_t x0, uint32_t base) {
+        return pfx::neon::vignette(run, vignette, x0, base);
+      });
 }
 
 void fx_apply_vignette_prev(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  if (src == nullptr || dst == nullptr || pfx::pixel_count(width, height) > pfx::kMaxPixels) {
+    return;
+  }
   const pfx::PreviewVignette vignette(width, height);
-  pfx::for_each_pixel_weighted(src, dst, width, height, vignette, [](uint32_t p, uint32_t w) {
-    return pfx::scale_pixel(p, static_cast<int32_t>(w), pfx::PreviewVignette::kShift);
-  });
+  pfx::for_each_pixel_weighted(
+      src, nullptr, dst, width, height, vignette,
+      [](uint32_t p, uint32_t w) {
+        return pfx::scale_pixel(p, static_cast<int32_t>(w), pfx::PreviewVignette::kShift);
+      },
+      [&](const pfx::Run& run, int32_t x0, uint32_t base) {
+        return pfx::neon::vignette_preview(run, vignette, x0, base);
+      });
 }
 
 }  // extern "C"

@@ -7,6 +7,7 @@
 #include <cstdint>
 
 #include "frame/frame.h"
+#include "frame/kernel.h"
 
 namespace pfx {
 
@@ -99,6 +100,14 @@ class PreviewVignette : public FallOff {
   }
 };
 
+// NEON kernels of the weighted looks (looks/vignette_neon.cpp): the vignettes, and the old photo
+// (its folded curves, then the table-based weight).
+namespace neon {
+PFX_NEON_KERNEL(size_t vignette(const Run&, const DividedVignette&, int32_t, uint32_t))
+PFX_NEON_KERNEL(size_t vignette_preview(const Run&, const PreviewVignette&, int32_t, uint32_t))
+PFX_NEON_KERNEL(size_t oldphoto(const Run&, const PreviewVignette&, int32_t, uint32_t))
+}  // namespace neon
+
 // dst[i] = rule(src[i], x, y) for every pixel in row order; src and dst may be the same buffer.
 // Returns false, having written nothing, for a null buffer or an image too large to address.
 template <class Rule>
@@ -115,22 +124,35 @@ bool for_each_pixel_at(const uint32_t* src, uint32_t* dst, int32_t width, int32_
   return true;
 }
 
+// A vector kernel of a weighted rule: edits a prefix of a run of one row given the row's first
+// column and the fall-off's base of the row, returns its length (frame/kernel.h).
+struct NoRowKernel {
+  size_t operator()(const Run&, int32_t, uint32_t) const { return 0; }
+};
+
 // dst[i] = rule(src[i], weight) for every pixel in row order, the weight of the fall-off at the
-// pixel; src and dst may be the same buffer. Writes nothing for a null buffer or an image too
-// large to address.
-template <class Rule>
-bool for_each_pixel_weighted(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
-                             const FallOff& falloff, Rule&& rule) {
-  if (src == nullptr || dst == nullptr) return false;
-  const int64_t n = pixel_count(width, height);
-  if (n > kMaxPixels) return false;
-  if (n == 0) return true;
-  size_t i = 0;
-  for (int32_t y = 0; y < height; ++y) {
+// pixel, through the kernel first where the path has one; with a mask only where the mask byte
+// is 1, the other pixels getting their source value. src and dst may be the same buffer. The
+// caller has checked the buffers and the size.
+template <class Rule, class Kernel = NoRowKernel>
+void for_each_pixel_weighted(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                             int32_t height, const FallOff& falloff, Rule&& rule,
+                             const Kernel& kernel = {}) {
+  const bool vector = neon_kernels();
+  const size_t w = width > 0 ? static_cast<size_t>(width) : 0;
+  for (int32_t y = 0; y < height && w > 0; ++y) {
     const uint32_t base = falloff.row(y);
-    for (int32_t x = 0; x < width; ++x, ++i) dst[i] = rule(src[i], falloff.weight(base, x));
+    const size_t row = static_cast<size_t>(y) * w;
+    const uint8_t* row_mask = mask == nullptr ? nullptr : mask + row;
+    const size_t done = vector ? kernel(Run{src + row, row_mask, dst + row, w}, 0, base) : 0;
+    for (size_t x = done; x < w; ++x) {
+      const size_t i = row + x;
+      const uint32_t p = src[i];
+      dst[i] = mask == nullptr || mask[i] == 1
+                   ? rule(p, falloff.weight(base, static_cast<int32_t>(x)))
+                   : p;
+    }
   }
-  return true;
 }
 
 }  // namespace pfx
