@@ -5,6 +5,7 @@
 #include <cstddef>
 
 #include "adjust/brightness_contrast.h"
+#include "adjust/channel_map.h"
 #include "adjust/exposure_hue.h"
 #include "adjust/faded_invert.h"
 #include "adjust/gains_colortone.h"
@@ -20,6 +21,8 @@ PFX_NEON_KERNEL(size_t kernel(const Run&, const Temperature&))
 PFX_NEON_KERNEL(size_t kernel(const Run&, const Exposure&))
 PFX_NEON_KERNEL(size_t kernel(const Run&, const Fade&))
 PFX_NEON_KERNEL(size_t kernel(const Run&, const Gains&))
+// Any per-channel rule as its channel map, by the table instructions (no mask).
+PFX_NEON_KERNEL(size_t kernel(const Run&, const ChannelMap&))
 
 }  // namespace pfx::neon
 

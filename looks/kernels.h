@@ -19,4 +19,8 @@ PFX_NEON_KERNEL(size_t downlight_tail(const Run&))
 
 PFX_NEON_KERNEL(size_t sepia(const Run&))
 
+// Levels within 0 <= low < high <= 255 on the channels a selector picks: input levels
+// (scale (c - low)) >> 10 or output levels ((scale c) >> 10) + low, for scales below 2^15.
+PFX_NEON_KERNEL(size_t levels(const Run&, int32_t, bool, int32_t, int32_t))
+
 }  // namespace pfx::neon

@@ -9,8 +9,10 @@
 #include <cstdint>
 
 #include "adjust/channel_map.h"
+#include "adjust/kernels.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
+#include "looks/kernels.h"
 #include "looks/tone_curves.h"
 #include "photofx.h"
 
@@ -42,19 +44,22 @@ auto selected_channels_arithmetic(int32_t channel, Curve curve) {
 }
 
 // Levels within 0 <= low < high <= 255, the range the looks use, keep every product within 32
-// bits and take the arithmetic form, unless the table form is the faster one on this CPU; other
-// levels take the table, made in 64 bits.
+// bits and take the arithmetic form (through the NEON kernel on that path), unless the table
+// form is the faster one on this CPU; other levels take the table, made in 64 bits.
 bool levels_by_arithmetic(int32_t low, int32_t high) {
-  return low >= 0 && low < high && high <= 255 && !channel_map_is_fast();
+  return low >= 0 && low < high && high <= 255 && !channel_map_is_fast() &&
+         (neon_kernels() || !kChannelTablesBeatArithmetic);
 }
 
-// The full-variant frame for the table form.
+// The full-variant frame for the table form, through the NEON table lookups on that path.
 void map_image(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                const ChannelMap& map) {
   if (src == nullptr || dst == nullptr) return;
   const int64_t n = pixel_count(width, height);
   if (n > kMaxPixels) return;
-  map_channels(map, src, dst, static_cast<size_t>(n));
+  const size_t done =
+      neon_kernels() ? neon::kernel(Run{src, nullptr, dst, static_cast<size_t>(n)}, map) : 0;
+  map_channels(map, src + done, dst + done, static_cast<size_t>(n) - done);
 }
 
 }  // namespace
@@ -79,10 +84,11 @@ void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, i
   const pfx::InputLevels curve(low, high);
   if (pfx::levels_by_arithmetic(low, high)) {
     const int32_t s32 = static_cast<int32_t>(curve.scale);
-    pfx::for_each_pixel(src, dst, width, height,
-                        pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
-                          return pfx::clamp_byte((s32 * (c - low)) >> 10);
-                        }));
+    pfx::for_each_pixel(
+        src, dst, width, height,
+        pfx::selected_channels_arithmetic(
+            channel, [=](int32_t c) { return pfx::clamp_byte((s32 * (c - low)) >> 10); }),
+        [&](const pfx::Run& run) { return pfx::neon::levels(run, channel, true, low, s32); });
     return;
   }
   pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, curve));
@@ -94,10 +100,11 @@ void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, 
   const pfx::OutputLevels curve(low, high);
   if (pfx::levels_by_arithmetic(low, high)) {
     const int32_t s32 = static_cast<int32_t>(curve.scale);
-    pfx::for_each_pixel(src, dst, width, height,
-                        pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
-                          return pfx::clamp_byte(((s32 * c) >> 10) + low);
-                        }));
+    pfx::for_each_pixel(
+        src, dst, width, height,
+        pfx::selected_channels_arithmetic(
+            channel, [=](int32_t c) { return pfx::clamp_byte(((s32 * c) >> 10) + low); }),
+        [&](const pfx::Run& run) { return pfx::neon::levels(run, channel, false, low, s32); });
     return;
   }
   pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, curve));
