@@ -137,7 +137,21 @@ struct SphereRun {
   int32_t k_hi[257], k_lo[257];   // pinch: k >> 7 and k & 127 for each t
 };
 
+// The twirl's fast path (twirl.cpp) for radii up to 4095.
+struct TwirlRun {
+  int32_t width, height, cx, cy;
+  uint32_t radius;  // 1 ... 4095
+  uint32_t inv_rr;  // 2^30 / radius^2
+  uint32_t turn;    // |angle|
+  bool clockwise;
+};
+
 namespace neon {
+// The source points of a twirl run (twirl.cpp's twirl_points), four at a time; returns how
+// many it did.
+PFX_NEON_KERNEL(size_t twirl_points(const TwirlRun&, int32_t, int32_t, int32_t, int32_t,
+                                    PointChunk&))
+
 // The source points of a sphericity run (sphericity.cpp's sphericity_points), four at a time;
 // returns how many it did.
 PFX_NEON_KERNEL(size_t sphericity_points(const SphereRun&, int32_t, int32_t, int32_t, int32_t,

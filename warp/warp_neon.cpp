@@ -10,6 +10,7 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "photofx.h"
 #include "warp/warp.h"
 
 namespace pfx::neon {
@@ -136,6 +137,95 @@ size_t sphericity_points(const SphereRun& run, int32_t dy, int32_t dx0, int32_t 
       bulge_axis(cx, dx, den, recip, out.sx + i, out.fx + i);
       bulge_axis(cy, vdy, den, recip, out.sy + i, out.fy + i);
     }
+  }
+  return m;
+}
+
+namespace {
+
+// Four lanes of a table of signed or unsigned 32-bit entries, one scalar read each.
+template <class T>
+inline uint32x4_t look_up_any(const T* table, uint32x4_t index) {
+  uint32x4_t v = vdupq_n_u32(static_cast<uint32_t>(table[vgetq_lane_u32(index, 0)]));
+  v = vsetq_lane_u32(static_cast<uint32_t>(table[vgetq_lane_u32(index, 1)]), v, 1);
+  v = vsetq_lane_u32(static_cast<uint32_t>(table[vgetq_lane_u32(index, 2)]), v, 2);
+  return vsetq_lane_u32(static_cast<uint32_t>(table[vgetq_lane_u32(index, 3)]), v, 3);
+}
+
+// One axis of the twirl's offset, as twirl_points has it: T >> 14 = (a + (b >> 7)) >> 7 from
+// a = mag h and b = mag ml, exact when T's low 14 bits, those of (a << 7) + b, are zero.
+inline void twirl_axis(int32x4_t centre, uint32x4_t h, uint32x4_t ml, uint32x4_t mag,
+                       uint32x4_t neg, int32_t* coord, uint16_t* weight) {
+  const uint32x4_t a = vmulq_u32(mag, h), b = vmulq_u32(mag, ml);
+  const uint32x4_t t14 = vshrq_n_u32(vsraq_n_u32(a, b, 7), 7);
+  const int32x4_t whole = vreinterpretq_s32_u32(vshrq_n_u32(t14, 11));
+  const uint32x4_t part = vandq_u32(t14, vdupq_n_u32(2047));
+  const uint32x4_t inexact =
+      vtstq_u32(vaddq_u32(vshlq_n_u32(a, 7), b), vdupq_n_u32(16383));  // all ones: inexact
+  // neg: centre - whole - 1 and 2048 - part - (inexact ? 1 : 0); else centre + whole and part.
+  const int32x4_t down = vsubq_s32(vsubq_s32(centre, whole), vdupq_n_s32(1));
+  vst1q_s32(coord, vbslq_s32(neg, down, vaddq_s32(centre, whole)));
+  const uint32x4_t flipped = vaddq_u32(vsubq_u32(vdupq_n_u32(2048), part), inexact);
+  vst1_u16(weight, vmovn_u32(vbslq_u32(neg, flipped, part)));
+}
+
+}  // namespace
+
+size_t twirl_points(const TwirlRun& run, int32_t dy, int32_t dx0, int32_t step, int32_t n,
+                    PointChunk& out) {
+  const size_t m = n > 0 ? static_cast<size_t>(n) & ~size_t{3} : 0;
+  const int32_t lanes[4] = {0, 1, 2, 3};
+  int32x4_t dx = vmlaq_n_s32(vdupq_n_s32(dx0), vld1q_s32(lanes), step);
+  const int32x4_t advance = vdupq_n_s32(4 * step);
+  const uint32_t ax = static_cast<uint32_t>(dy < 0 ? -dy : dy);  // |b| of FATAN2(dx, dy)
+  const uint32x4_t vax = vdupq_n_u32(ax), dy2 = vdupq_n_u32(ax * ax);
+  const bool below = dy > 0;
+  const uint32_t start = run.clockwise ? kAngle360 : 0;
+  const uint32_t signed_turn = run.clockwise ? 0u - run.turn : run.turn;
+  const int32x4_t cx = vdupq_n_s32(run.cx), cy = vdupq_n_s32(run.cy);
+  for (size_t i = 0; i < m; i += 4, dx = vaddq_s32(dx, advance)) {
+    const uint32x4_t ay = vreinterpretq_u32_s32(vabsq_s32(dx));
+    const uint32x4_t d2 = vmlaq_u32(dy2, ay, ay);
+    const uint32x4_t rho = look_up_any(SQRT_STEP_4, vshrq_n_u32(vmulq_n_u32(d2, run.inv_rr), 14));
+    const uint32x4_t D = vmulq_n_u32(rho, run.radius);
+    // FATAN2(dx, dy); the centre is never here.
+    const uint32x4_t steep = vcgtq_u32(ay, vax);
+    const uint32x4_t lo = vbslq_u32(steep, vax, ay), hi = vbslq_u32(steep, ay, vax);
+    const uint32x4_t index = vshrq_n_u32(vmulq_u32(lo, look_up_any(kInverse29, hi)), 18);
+    const uint32x4_t tab = look_up_any(ATAN, vandq_u32(index, vdupq_n_u32(2047)));
+    const uint32x4_t t0 =
+        vbslq_u32(vceqq_u32(index, vdupq_n_u32(2048)), vdupq_n_u32(kAngle45), tab);
+    const uint32x4_t t = vbslq_u32(steep, vsubq_u32(vdupq_n_u32(kAngle90), t0), t0);
+    // Quadrants as base + t or base - t: (0, +), (360, -) below the centre, (180, -), (180, +)
+    // above it.
+    const uint32x4_t right = vcgeq_s32(dx, vdupq_n_s32(0));
+    const uint32x4_t base =
+        below ? vbslq_u32(right, vdupq_n_u32(0), vdupq_n_u32(kAngle360)) : vdupq_n_u32(kAngle180);
+    const uint32x4_t plus = below ? right : vmvnq_u32(right);
+    const uint32x4_t theta = vbslq_u32(plus, vaddq_u32(base, t), vsubq_u32(base, t));
+    // theta + twist in 0 .. 720 degrees (below 2^29); divided by 11520 with the doubling high
+    // multiply by ceil(2^44 / 11520) = 1527099484 (excess 11264, so sum x 11264 < 2^44 keeps it
+    // exact), the product shifted by 31 and then 13.
+    const uint32x4_t sum = vmlaq_n_u32(vaddq_u32(theta, vdupq_n_u32(start)),
+                                       vsubq_u32(vdupq_n_u32(uint32_t{1} << 19), rho), signed_turn);
+    const uint32x4_t quotient = vshrq_n_u32(
+        vreinterpretq_u32_s32(vqdmulhq_s32(vreinterpretq_s32_u32(sum), vdupq_n_s32(1527099484))),
+        13);
+    const uint32x4_t k = vandq_u32(quotient, vdupq_n_u32(16383));
+    const uint32x4_t q = vshrq_n_u32(k, 12), r = vandq_u32(k, vdupq_n_u32(4095));
+    const uint32x4_t pair = look_up_any(kSinCos, r);
+    const uint32x4_t near = vandq_u32(pair, vdupq_n_u32(0xFFFF)), far = vshrq_n_u32(pair, 16);
+    const uint32x4_t odd = vtstq_u32(q, vdupq_n_u32(1));
+    const uint32x4_t sv = vbslq_u32(odd, far, near), cv = vbslq_u32(odd, near, far);
+    const uint32x4_t s_neg = vandq_u32(vcgeq_u32(q, vdupq_n_u32(2)), vtstq_u32(sv, sv));
+    const uint32x4_t c_quarter =
+        vorrq_u32(vceqq_u32(q, vdupq_n_u32(1)), vceqq_u32(q, vdupq_n_u32(2)));
+    const uint32x4_t c_neg = vandq_u32(c_quarter, vtstq_u32(cv, cv));
+    const uint32x4_t h = vshrq_n_u32(D, 16);
+    const uint32x4_t ml =
+        vaddq_u32(vandq_u32(vshrq_n_u32(D, 8), vdupq_n_u32(255)), vandq_u32(D, vdupq_n_u32(255)));
+    twirl_axis(cx, h, ml, sv, s_neg, out.sx + i, out.fx + i);
+    twirl_axis(cy, h, ml, cv, c_neg, out.sy + i, out.fy + i);
   }
   return m;
 }
