@@ -141,6 +141,8 @@ void run_blur(const uint32_t* src, const uint8_t* blur, const uint8_t* mask, con
   if (mask == nullptr && !every_pixel) return;
   const int64_t n = pfx::pixel_count(width, height);
   if (n == 0 || n > pfx::kMaxPixels) return;
+  // A working size no buffer could hold is refused like any other such size.
+  if (pfx::pixel_count(sw, sh) > pfx::kMaxPixels) return;
   if (!pfx::can_composite(sw, sh)) {
     // Too few working samples to interpolate between (or too many for the coordinates): hand
     // back the source rather than read past the working image.

@@ -113,6 +113,8 @@ void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uint32_t* dst, 
                        int32_t half_height) {
   if (src == nullptr || blur == nullptr || dst == nullptr) return;
   if (!pfx::is_image(width, height)) return;
+  // A working size no buffer could hold is refused like any other such size.
+  if (pfx::pixel_count(sw, sh) > pfx::kMaxPixels) return;
   if (!pfx::can_composite(sw, sh)) {
     pfx::copy_image(src, dst, pfx::pixel_count(width, height));
     return;

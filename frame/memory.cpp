@@ -7,20 +7,28 @@
 
 #include "frame/alloc_hook.h"
 
+namespace {
+
+// Both counts are 32-bit and the library's blocks stay below 2^32 bytes on every target. A
+// product beyond that is refused here rather than left to the C library, which on a 64-bit
+// target would hand out a block no 32-bit target could, and which in malloc's case would see
+// the product wrapped into a short block that the caller then overruns.
+bool fits_32_bits(uint32_t count, uint32_t size) {
+  return static_cast<uint64_t>(count) * size <= UINT32_MAX;
+}
+
+}  // namespace
+
 extern "C" {
 
 void* fx_calloc(uint32_t count, uint32_t size) {
-  if (!pfx::allocation_allowed()) return nullptr;
+  if (!fits_32_bits(count, size) || !pfx::allocation_allowed()) return nullptr;
   return std::calloc(count, size);
 }
 
 void* fx_malloc(uint32_t count, uint32_t size) {
-  // count x size is formed in 64 bits: a product beyond 32 bits would otherwise wrap into a
-  // short block that the caller then overruns.
-  const uint64_t bytes = static_cast<uint64_t>(count) * size;
-  if (bytes > UINT32_MAX) return nullptr;
-  if (!pfx::allocation_allowed()) return nullptr;
-  return std::malloc(static_cast<size_t>(bytes));
+  if (!fits_32_bits(count, size) || !pfx::allocation_allowed()) return nullptr;
+  return std::malloc(static_cast<size_t>(count) * size);
 }
 
 void* fx_realloc(void* ptr, uint32_t size) {

@@ -317,7 +317,9 @@ void composite(FuzzedDataProvider& in) {
   FUZZ_CHECK(w.image.guards_intact() && w.depth.guards_intact());
   FUZZ_CHECK(w.image.contents() == image_before && w.depth.contents() == depth_before);
   const bool every_pixel = flag != 0;
-  if (refused(im, !restore && !every_pixel) || null_blur || (!restore && null_depth)) {
+  const bool unaddressable = pfx::pixel_count(sw, sh) > pfx::kMaxPixels;
+  if (refused(im, !restore && !every_pixel) || null_blur || (!restore && null_depth) ||
+      unaddressable) {
     im.check_untouched(before);
     return;
   }

@@ -32,10 +32,17 @@ extern "C" {
 #define PHOTOFX_OUT_OF_MEMORY 40961    /* 0xA001: a scratch buffer could not be allocated */
 #define PHOTOFX_INVALID_ARGUMENT 40962 /* 0xA002: a null buffer or a level out of range */
 
+/* ---- Version of this header and the library built from it -------------------------------- */
+
+#define PHOTOFX_VERSION_MAJOR 0
+#define PHOTOFX_VERSION_MINOR 1
+#define PHOTOFX_VERSION_PATCH 0
+
 /* ---- Memory wrappers: every allocation, fill and whole-image copy of the library ---------- */
 
-PHOTOFX_API void* fx_calloc(uint32_t count, uint32_t size); /* zero-filled; null on failure */
-PHOTOFX_API void* fx_malloc(uint32_t count, uint32_t size); /* null when count x size overflows */
+/* Both give null when count x size passes 32 bits, on every target; calloc's block is zeroed. */
+PHOTOFX_API void* fx_calloc(uint32_t count, uint32_t size);
+PHOTOFX_API void* fx_malloc(uint32_t count, uint32_t size);
 PHOTOFX_API void* fx_realloc(void* ptr, uint32_t size);
 PHOTOFX_API void fx_free(void* ptr);
 PHOTOFX_API void* fx_memset(void* ptr, int32_t value, uint32_t count);   /* returns ptr */
@@ -55,13 +62,17 @@ PHOTOFX_API extern const uint32_t LUT_DELTA2[256]; /* 60 x LUT_DELTA[i] */
 PHOTOFX_API void fx_rgb2hsv(int32_t r, int32_t g, int32_t b, int32_t* h, int32_t* s, int32_t* v);
 PHOTOFX_API void fx_hsv2rgb(int32_t h, int32_t s, int32_t v, int32_t* r, int32_t* g, int32_t* b);
 
-/* ---- Brightness and contrast: level 0..20, 10 leaves the image as it is ------------------- */
+/* ---- Brightness and contrast: level 0..20, 10 at the centre ------------------------------ */
 
+/* Adds (level - 10) x 10 to the luma. Every pixel makes a fixed-point YCbCr round trip, which
+ * leaves greys, black and white as they are but moves most colours by a step or two even at
+ * level 10 (0xFFFF0000 comes back as 0xFFFE0000). */
 PHOTOFX_API void controlBrightness(const uint32_t* src, uint32_t* dst, int32_t width,
                                    int32_t height, int32_t level);
 PHOTOFX_API void controlBrightnessPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                           int32_t width, int32_t height, int32_t level,
                                           int32_t left, int32_t right, int32_t top, int32_t bottom);
+/* Pushes each channel away from 128 above level 10, draws it toward 128 below; 10 keeps it. */
 PHOTOFX_API void controlContrast(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                  int32_t level);
 PHOTOFX_API void controlContrastPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
@@ -79,15 +90,16 @@ PHOTOFX_API void fx_control_contrast(const uint32_t* src, const uint8_t* mask, u
                                      int32_t width, int32_t height, int32_t level, int32_t left,
                                      int32_t right, int32_t top, int32_t bottom);
 
-/* ---- Saturation and temperature: level 0..20, 10 neutral ---------------------------------- */
+/* ---- Saturation and temperature: level 0..20, 10 at the centre --------------------------- */
 
-/* Level 0 is grey, 20 about doubles each colour's distance from grey. */
+/* Level 0 is grey, 10 keeps every pixel, 20 about doubles each colour's distance from grey. */
 PHOTOFX_API void controlSaturation(const uint32_t* src, uint32_t* dst, int32_t width,
                                    int32_t height, int32_t level);
 PHOTOFX_API void controlSaturationPartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                           int32_t width, int32_t height, int32_t level,
                                           int32_t left, int32_t right, int32_t top, int32_t bottom);
-/* Above 10 warmer (less blue, more red), below 10 cooler. */
+/* Above 10 warmer (less blue, more red), below 10 cooler; at 10 no shift, but the YCbCr round
+ * trip of brightness still moves most colours by a step or two. */
 PHOTOFX_API void controlTemperature(const uint32_t* src, uint32_t* dst, int32_t width,
                                     int32_t height, int32_t level);
 PHOTOFX_API void controlTemperaturePartial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
@@ -288,7 +300,9 @@ PHOTOFX_API void make_gaussian_blur(const uint8_t* src, uint8_t* dst, const uint
 PHOTOFX_API void make_lens_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth,
                                 int32_t width, int32_t height, int32_t level);
 /* Scales a blurred sw x sh working image up into dst through the depth map; pixels with a
- * nonzero mask byte (every pixel while `all` is 1) are recomputed. dst may be src. */
+ * nonzero mask byte (every pixel while `all` is 1) are recomputed. dst may be src. A working
+ * side under 2 or over 2048 samples gives a copy of src; an sw x sh beyond 536,870,911 samples
+ * writes nothing. */
 PHOTOFX_API void run_blur(const uint32_t* src, const uint8_t* blur, const uint8_t* mask,
                           const uint8_t* depth, uint32_t* dst, int32_t width, int32_t height,
                           int32_t sw, int32_t sh);
@@ -315,7 +329,8 @@ PHOTOFX_API void fx_apply_tiltshift(const uint32_t* src, uint32_t* dst, int32_t 
 PHOTOFX_API void fx_destroy_tiltshift(void);
 /* The widest Gaussian blur of a working image, every sample counted. dst may be src. */
 PHOTOFX_API void make_tiltshift(const uint8_t* src, uint8_t* dst, int32_t width, int32_t height);
-/* Scales a blurred working image up and mixes it with src by each row's sharpness. */
+/* Scales a blurred working image up and mixes it with src by each row's sharpness; working
+ * sizes are treated as by run_blur. */
 PHOTOFX_API void restore_tiltshift(const uint32_t* src, const uint8_t* blur, uint32_t* dst,
                                    int32_t width, int32_t height, int32_t sw, int32_t sh,
                                    int32_t centre, int32_t half_height);
@@ -524,7 +539,9 @@ PHOTOFX_API int32_t runMirror(const uint32_t* src, int32_t src_width, int32_t sr
 /* ---- Sphericity and twirl --------------------------------------------------------------------
  * Both copy src to dst and warp the pixels of the window (left..right, top..bottom, clipped to
  * the image) that fall inside their circle around (cx, cy); warped pixels get alpha 255. A
- * non-zero `fast` computes every second pixel and fills 2 x 2 blocks, never beyond the window.
+ * non-zero `fast` computes every second pixel of every second row from the window's corner and
+ * fills the whole 2 x 2 block right of and below each: past an odd-sized window's last column
+ * or row by one, never beyond the image.
  * They return PHOTOFX_INVALID_ARGUMENT, writing nothing, for a null or overlapping buffer, a
  * centre outside the image or a radius, level or angle out of range. */
 

@@ -130,9 +130,13 @@ TEST(BlurComposite, DepthMaskAndWorkingSizeDecideWhatChanges) {
   Pixels in_place = src;
   run_blur(in_place.data(), blur.data(), some.data(), ones.data(), in_place.data(), W, H, SW, SH);
   EXPECT_EQ(in_place, run(some.data(), ones, SW, SH));
-  // Fewer than two working samples a side (or more than the coordinates hold): the source.
+  // Fewer than two working samples a side (or more than the coordinates hold): the source; a
+  // working size whose sample count does not fit: nothing.
   for (const auto& [sw, sh] : {std::pair{1, 4}, {4, 1}, {0, 0}, {2049, 2}, {2, 2049}}) {
     EXPECT_EQ(run(every.data(), ones, sw, sh), src) << sw << "x" << sh;
+  }
+  for (const auto& [sw, sh] : {std::pair{65536, 65536}, {INT32_MAX, 3}, {1, INT32_MAX}}) {
+    EXPECT_EQ(run(every.data(), ones, sw, sh), Pixels(src.size(), kUntouched)) << sw << "x" << sh;
   }
 }
 

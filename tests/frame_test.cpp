@@ -12,8 +12,10 @@
 namespace {
 
 TEST(Memory, WrappersRefuseProductsBeyond32BitsZeroFillAndKeepContents) {
-  EXPECT_EQ(fx_malloc(0x10000u, 0x10000u), nullptr);
-  EXPECT_EQ(fx_malloc(0x80000000u, 2u), nullptr);
+  for (const auto alloc : {fx_malloc, fx_calloc}) {
+    EXPECT_EQ(alloc(0x10000u, 0x10000u), nullptr);  // exactly 2^32 bytes
+    EXPECT_EQ(alloc(0x80000000u, 2u), nullptr);
+  }
   auto* p = static_cast<uint32_t*>(fx_calloc(8u, 4u));
   ASSERT_NE(p, nullptr);
   for (int i = 0; i < 8; ++i) EXPECT_EQ(p[i], 0u);

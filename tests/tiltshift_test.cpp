@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstdint>
 #include <iterator>
+#include <tuple>
 #include <vector>
 
 #include "frame/alloc_hook.h"
@@ -171,6 +172,15 @@ TEST_F(TiltShift, TinyImagesAreCopiedAndRefusedCallsWriteNothing) {
   }
   const Pixels img = pfx::test::random_image(8, 8, 24);
   const Pixels untouched(img.size(), kUntouched);
+  // restore_tiltshift copies from a working size too small to interpolate, and writes nothing
+  // for one whose sample count does not fit.
+  const Bytes blur(4 * 3, 0);
+  for (const auto& [sw, sh, copied] :
+       {std::tuple{1, 4, true}, {2049, 2, true}, {65536, 65536, false}, {INT32_MAX, 3, false}}) {
+    Pixels dst = untouched;
+    restore_tiltshift(img.data(), blur.data(), dst.data(), 8, 8, sw, sh, 4, 1);
+    EXPECT_EQ(dst, copied ? img : untouched) << sw << "x" << sh;
+  }
   fx_init_tiltshift(img.data(), 8, 8);
   EXPECT_EQ(tilt(fx_tiltshift_preview, img, -8, 8, 4, 1), untouched);
   fx_tiltshift_preview(nullptr, nullptr, 8, 8, 4, 1);

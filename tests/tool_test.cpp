@@ -2,6 +2,7 @@
 // through `apply` against the library called directly, whole and under a selection, every way of
 // selecting, several inputs with --out-dir, the errors users meet, `list` and the gallery.
 #include <gtest/gtest.h>
+#include <jpeglib.h>
 
 #include <algorithm>
 #include <cstdint>
@@ -15,8 +16,12 @@
 #include "photofx.h"
 #include "support/files.h"
 #include "support/images.h"
+#include "catalog/chain.h"
+#include "catalog/params.h"
+#include "catalog/selection.h"
+#include "catalog/texture.h"
+#include "tools/exif.h"
 #include "tools/image.h"
-#include "tools/texture.h"
 
 namespace {
 
@@ -33,7 +38,8 @@ Image photo(int32_t w, int32_t h, uint64_t seed) {
   Image img;
   img.width = w;
   img.height = h;
-  img.pixels = pfx::test::random_image(w, h, seed);
+  const pfx::test::Pixels px = pfx::test::random_image(w, h, seed);
+  img.pixels.assign(px.begin(), px.end());
   return img;
 }
 
@@ -172,7 +178,7 @@ TEST_F(Tool, EveryEffectMatchesTheLibraryWholeAndUnderASelection) {
       {{"old-photo"}, [](auto... a) { applyOldPhoto(a...); }},
       {{"old-photo-texture"},
        [](auto s, auto d, auto w, auto h) {
-         fx_apply_oldphoto_texture(s, d, fxtool::paper_texture(w, h).pixels.data(), w, h);
+         fx_apply_oldphoto_texture(s, d, fxcat::paper_texture(w, h).data(), w, h);
        }},
       {{"pop-art"}, [](auto... a) { applyPopArt(a...); }},
       {{"pop-art-preview"}, [](auto... a) { fx_apply_popart_prev(a...); }},
@@ -200,8 +206,9 @@ TEST_F(Tool, EveryEffectMatchesTheLibraryWholeAndUnderASelection) {
 
 // Where a selection does more than cut out the whole-image result: a masked blur draws on the
 // selected pixels only, the blur preview builds its workspace from the mask, the warps take the
-// selection's box as their window (fast mode's blocks start at its corner), and mirror makes the
-// picture the size the library names for it.
+// selection's box as their window (fast mode's blocks start at its corner; those the library
+// fills one past it are not selected and keep the source), and mirror makes the picture the size
+// the library names for it.
 TEST_F(Tool, SelectionsReachTheLibraryAsMaskBoundsAndWindow) {
   const std::vector<uint8_t> mask = rect_mask();
   const uint8_t* m = mask.data();
@@ -218,12 +225,14 @@ TEST_F(Tool, SelectionsReachTheLibraryAsMaskBoundsAndWindow) {
               fx_make_blur_preview(s, m, d, w, h, 2);
               fx_destroy_blur();
             }).pixels);
+  const Image warped = lib(src, [](auto s, auto d, auto w, auto h) {
+    runSphericity(s, d, w, h, 8, 9, 6, -70, 2, 16, 3, 14, 1);
+  });
+  const auto in_box = [](int32_t x, int32_t y) { return x >= 2 && x <= 16 && y >= 3 && y <= 14; };
   EXPECT_EQ(apply({"sphericity", "--cx", "8", "--cy", "9", "--radius", "6", "--level", "-70",
                    "--fast", "on", "--rect", "2,3,15,12"})
                 .pixels,
-            lib(src, [](auto s, auto d, auto w, auto h) {
-              runSphericity(s, d, w, h, 8, 9, 6, -70, 2, 16, 3, 14, 1);
-            }).pixels);
+            where(src, warped, in_box).pixels);
 
   const auto mirrored = [&](int32_t pos, int32_t mode, int32_t axis) {
     Image o;
@@ -294,8 +303,8 @@ TEST_F(Tool, OutDirWritesEachInputUnderItsNameAndGoesOnAfterAFailure) {
   const Image other = photo(kWidth, kHeight, 12);
   ASSERT_EQ(fxtool::write_image(dir / "b.png", other), "");
   const std::string done = dir / "done", missing = dir / "missing.png";
-  const Ran ran = tool({"apply", "brightness", "--level", "7", "--progress", "--out-dir", done, in,
-                        missing, dir / "b.png"});
+  const Ran ran = tool({"apply", "brightness", "--level", "7", "--progress", "-j", "1", "--out-dir",
+                        done, in, missing, dir / "b.png"});
   EXPECT_EQ(ran.status, 1);
   EXPECT_EQ(decoded(done + "/in.png").pixels, brightness(src, 7).pixels);
   EXPECT_EQ(decoded(done + "/b.png").pixels, brightness(other, 7).pixels);
@@ -321,6 +330,11 @@ TEST_F(Tool, RefusedRunsSayWhyOnOneLineAndWriteNothing) {
   const std::string png = pfx::test::read_file(in);
   pfx::test::write_file(dir / "cut.png", png.substr(0, png.size() / 2));
   ASSERT_EQ(fxtool::write_image(dir / "small.png", photo(5, 5, 13)), "");
+  for (const char* name : {"cut.webp", "cut.tif"}) {
+    ASSERT_EQ(fxtool::write_image(dir / name, src), "");
+    const std::string bytes = pfx::test::read_file(dir / name);
+    pfx::test::write_file(dir / name, bytes.substr(0, bytes.size() / 2));
+  }
   // Words of each command line; IN, OUT and D/ stand for the input, the output and the
   // directory they are in.
   const struct {
@@ -351,8 +365,24 @@ TEST_F(Tool, RefusedRunsSayWhyOnOneLineAndWriteNothing) {
        "mirror takes no selection (it changes the image's size)"},
       {1, "apply brightness D/missing.png OUT",
        "missing.png: cannot open: No such file or directory"},
-      {1, "apply brightness D/text.png OUT", "text.png: not a PNG or JPEG image"},
+      {1, "apply brightness D/text.png OUT", "text.png: not a PNG, JPEG, WebP or TIFF image"},
       {1, "apply brightness D/cut.png OUT", "cut.png: cannot decode PNG"},
+      {1, "apply brightness D/cut.webp OUT", "cut.webp: cannot decode WebP"},
+      {1, "apply brightness D/cut.tif OUT", "cut.tif: cannot decode TIFF"},
+      {1, "apply brightness --max-pixels 390 IN OUT",
+       "23x17 is 391 pixels, more than --max-pixels"},
+      {2, "apply brightness --level 13 , contrast --level 42 IN OUT",
+       "step 2 (contrast): --level 42 is out of range 0..20"},
+      {2, "apply brightness + contrast IN OUT", "'+' does not separate steps"},
+      {2, "apply brightness --level 13, contrast IN OUT", "not '13,' (steps are separated by"},
+      {2, "apply brightness , , contrast IN OUT", "step 2 is empty"},
+      {2, "apply brightness --level 3 contrast IN OUT", "'contrast' is an effect: steps are"},
+      {2, "apply brightness IN , contrast OUT", "step 1 (brightness): unexpected"},
+      {2, "apply invert , mirror --rect 1,1,4,4 IN OUT", "step 2 (mirror): mirror takes no"},
+      {1, "apply invert , mirror --mode keep-top IN OUT", "step 2 (mirror): the library refused"},
+      {2, "apply brightness --lossless IN OUT", "--lossless is for WebP outputs"},
+      {2, "apply brightness --quality 101 IN D/out.jpg", "--quality needs a whole number 1..100"},
+      {2, "apply brightness -j 0 --out-dir D/o IN", "-j needs a number of files at once"},
       {1, "apply brightness --mask D/small.png IN OUT", "is 5x5 but the image is 23x17"},
       {1, "apply brightness --rect 23,0,5,5 IN OUT",
        "--rect 23,0,5,5 lies outside the 23x17 image"},
@@ -397,6 +427,164 @@ std::vector<std::string> listed_effects(const Ran& ran) {
     names.push_back(line.substr(0, line.find(' ')));
   }
   return names;
+}
+
+// A chain runs its steps in order on the decoded pixels, each with its own parameters and
+// selection, and selections after a change of size are measured on the new picture: the
+// library called step by step, with no encoding in between.
+TEST_F(Tool, AChainIsTheLibraryCalledStepByStep) {
+  const Image got = apply(
+      {"brightness", "--level",   "13",      ",",        "contrast",  "--level=12", "--rect", kRect,
+       ",",          "mirror",    "--axis",  "vertical", "--mode",    "keep-top",   "--row",  "9",
+       ",",          "greyscale", "--level", "4",        "--ellipse", "10,15,6,4"});
+  const Image step1 = brightness(src, 13);
+  const Image step2 =
+      where(step1, lib(step1, [](auto... a) { controlContrast(a..., 12); }), in_rect);
+  Image step3;
+  step3.resize(kWidth, 20);  // rows 0..9 and their reflection
+  ASSERT_EQ(runMirror(step2.pixels.data(), kWidth, kHeight, step3.pixels.data(), kWidth, 20, 9,
+                      MIRROR_KEEP_TOP, MIRROR_VERTICAL),
+            PHOTOFX_SUCCESS);
+  const Image grey = lib(step3, [](auto... a) { controlGreyscale(a..., 4); });
+  const Image step4 = where(step3, grey, [](int32_t x, int32_t y) {
+    return (x - 10) * (x - 10) * 16 + (y - 15) * (y - 15) * 36 <= 576;
+  });
+  EXPECT_EQ(got.height, 20);
+  EXPECT_EQ(got.pixels, step4.pixels);
+}
+
+// Files on several threads come out as the bytes one thread writes, even when every file's
+// chain uses the library's module-wide state (auto adjust's parameters, the blur workspace).
+// Pictures under 150 pixels a side never read the parameters, hence the size.
+TEST_F(Tool, ParallelBatchesWriteTheBytesOfASerialOne) {
+  std::vector<std::string> inputs;
+  for (const char* name : {"a.png", "b.jpg", "c.webp", "d.tif", "e.png", "f.jpg", "g.tif"}) {
+    inputs.push_back(dir / name);
+    ASSERT_EQ(fxtool::write_image(inputs.back(), photo(160, 150, inputs.size())), "");
+  }
+  for (const char* jobs : {"1", "4"}) {
+    std::vector<std::string> args{"apply", "auto-adjust",  "--cutoff",  "60",
+                                  ",",     "downlight",    "--weight1", "4000",
+                                  ",",     "blur-preview", ",",         "tilt-shift-preview",
+                                  "-j",    jobs,           "--out-dir", dir / jobs};
+    args.insert(args.end(), inputs.begin(), inputs.end());
+    const Ran ran = tool(args);
+    ASSERT_EQ(ran.status, 0) << ran.err;
+  }
+  for (const std::string& in_path : inputs) {
+    const std::string name = in_path.substr(in_path.rfind('/'));
+    EXPECT_EQ(pfx::test::read_file(dir / "4" + name), pfx::test::read_file(dir / "1" + name))
+        << name;
+  }
+}
+
+// A big-endian EXIF block as a phone writes it: the model, and orientation 6 (turn the
+// picture 90 degrees clockwise to view it).
+const std::string kPhoneExif(
+    "MM\0*\0\0\0\x08\0\x02"
+    "\x01\x10\0\x02\0\0\0\x04Pix\0"
+    "\x01\x12\0\x03\0\0\0\x01\0\x06\0\0"
+    "\0\0\0\0",
+    38);
+
+// An ICC profile for RGB pictures as libpng checks them: a header and one tag, whose data
+// does not compress to almost nothing (libpng refuses profiles that do).
+std::string icc_profile() {
+  std::string p(512, '\0');
+  const auto be32 = [&](size_t at, uint32_t v) {
+    for (size_t i = 0; i < 4; ++i) p[at + i] = static_cast<char>(v >> (24 - 8 * i));
+  };
+  be32(0, 512);
+  be32(8, 0x02100000u);
+  p.replace(12, 12, "mntrRGB XYZ ");
+  p.replace(36, 4, "acsp");
+  be32(68, 0xF6D6u);  // the D50 white point
+  be32(72, 0x10000u);
+  be32(76, 0xD32Du);
+  be32(128, 1);  // the tag: its signature, offset and size, then its data
+  p.replace(132, 4, "desc");
+  be32(136, 144);
+  be32(140, 512 - 144);
+  for (size_t i = 144; i < 512; ++i) p[i] = static_cast<char>(i * 37 % 251);
+  return p;
+}
+
+// Writes `img` as a JPEG through libjpeg itself, with EXIF, ICC and XMP markers.
+void write_phone_jpeg(const std::string& path, const Image& img, const std::string& icc,
+                      const std::string& xmp) {
+  FILE* f = std::fopen(path.c_str(), "wb");
+  ASSERT_NE(f, nullptr);
+  jpeg_compress_struct c{};
+  jpeg_error_mgr err{};
+  c.err = jpeg_std_error(&err);
+  jpeg_create_compress(&c);
+  jpeg_stdio_dest(&c, f);
+  c.image_width = static_cast<JDIMENSION>(img.width);
+  c.image_height = static_cast<JDIMENSION>(img.height);
+  c.input_components = 3;
+  c.in_color_space = JCS_RGB;
+  jpeg_set_defaults(&c);
+  jpeg_start_compress(&c, TRUE);
+  const auto marker = [&](const std::string& bytes) {
+    jpeg_write_marker(&c, JPEG_APP0 + 1, reinterpret_cast<const JOCTET*>(bytes.data()),
+                      static_cast<unsigned>(bytes.size()));
+  };
+  marker(std::string("Exif\0\0", 6) + kPhoneExif);
+  jpeg_write_icc_profile(&c, reinterpret_cast<const JOCTET*>(icc.data()),
+                         static_cast<unsigned>(icc.size()));
+  marker(std::string("http://ns.adobe.com/xap/1.0/", 29) + xmp);
+  std::vector<uint8_t> row(static_cast<size_t>(img.width) * 3);
+  for (int32_t y = 0; y < img.height; ++y) {
+    for (int32_t x = 0; x < img.width; ++x) {
+      for (int32_t k = 0; k < 3; ++k)
+        row[size_t(x) * 3 + k] = uint8_t(img.at(x, y) >> (16 - 8 * k));
+    }
+    JSAMPROW line = row.data();
+    jpeg_write_scanlines(&c, &line, 1);
+  }
+  jpeg_finish_compress(&c);
+  jpeg_destroy_compress(&c);
+  std::fclose(f);
+}
+
+// EXIF, ICC profile and XMP go from a phone's JPEG into every output format (TIFF keeps the
+// orientation and the model as its own tags); --strip leaves them out; --auto-orient turns the
+// pixels upright first, resets the orientation, and selections then refer to the upright picture.
+TEST_F(Tool, MetadataSurvivesAndAutoOrientTurnsThePictureUpright) {
+  const std::string jpeg = dir / "phone.jpg", icc = icc_profile(), xmp = "<x:xmpmeta/>";
+  write_phone_jpeg(jpeg, src, icc, xmp);
+  const auto metadata_of = [](const std::string& path) {
+    fxtool::Metadata m;
+    Image img;
+    EXPECT_EQ(fxtool::read_image(path, img, {.metadata = &m}), "") << path;
+    return m;
+  };
+  for (const char* name : {"o.jpg", "o.png", "o.webp", "o.tif"}) {
+    ASSERT_EQ(tool({"apply", "invert", jpeg, dir / name}).status, 0) << name;
+    const fxtool::Metadata m = metadata_of(dir / name);
+    EXPECT_EQ(m.icc, icc) << name;
+    EXPECT_EQ(m.xmp, xmp) << name;
+    if (name == std::string("o.tif")) {
+      EXPECT_EQ(fxtool::exif_orientation(m.exif), 6);
+      EXPECT_EQ(fxtool::exif_text_tags(m.exif), (fxtool::TextTags{{272, "Pix"}}));
+    } else {
+      EXPECT_EQ(m.exif, kPhoneExif) << name;
+    }
+  }
+  ASSERT_EQ(tool({"apply", "invert", "--strip", jpeg, out}).status, 0);
+  EXPECT_TRUE(metadata_of(out).empty());
+
+  const Image stored = decoded(jpeg);
+  Image upright;
+  upright.resize(kHeight, kWidth);
+  for (int32_t y = 0; y < kWidth; ++y) {
+    for (int32_t x = 0; x < kHeight; ++x) upright.at(x, y) = stored.at(y, kHeight - 1 - x);
+  }
+  ASSERT_EQ(tool({"apply", "invert", "--auto-orient", "--rect", "0,0,5,20", jpeg, out}).status, 0);
+  const Image inverted = lib(upright, [](auto... a) { applyInvert(a...); });
+  EXPECT_EQ(decoded(out).pixels,
+            where(upright, inverted, [](int32_t x, int32_t y) { return x < 5 && y < 20; }).pixels);
+  EXPECT_EQ(fxtool::exif_orientation(metadata_of(out).exif), 1);
 }
 
 // The gallery shows every effect `list` names at least once, each picture as `apply` would make
@@ -451,6 +639,24 @@ TEST_F(Tool, ListAndGalleryShowEveryEffect) {
   EXPECT_FALSE(std::filesystem::exists(dir / "b/brightness-level-0.png"));
 }
 
+// Help fits a terminal of 80 columns; --version names the library and the image libraries.
+TEST_F(Tool, HelpFitsEightyColumnsAndVersionNamesTheLibraries) {
+  std::vector<std::vector<std::string>> runs{{"help"}};
+  for (const std::string& name : listed_effects(tool({"list"}))) runs.push_back({"help", name});
+  for (const auto& args : runs) {
+    const Ran ran = tool(args);
+    EXPECT_EQ(ran.status, 0);
+    for (const std::string& line : lines(ran.out)) EXPECT_LE(line.size(), 80u) << line;
+  }
+  const Ran version = tool({"--version"});
+  EXPECT_EQ(version.status, 0);
+  const std::string library = "libphotofx " + std::to_string(PHOTOFX_VERSION_MAJOR) + "." +
+                              std::to_string(PHOTOFX_VERSION_MINOR) + ".";
+  for (const std::string& name : {library, std::string("libjpeg"), std::string("libtiff")}) {
+    EXPECT_NE(version.out.find(name), std::string::npos) << version.out;
+  }
+}
+
 // Auto adjust's parameters are module-wide, and the gallery runs every picture in one process:
 // a tuned auto adjust must not carry over into the downlight picture after it. Pictures under
 // 150 pixels a side never read the parameters, hence the larger input.
@@ -485,6 +691,61 @@ TEST_F(Tool, AutoAdjustParametersReachTheLibraryAndStayWithTheirPicture) {
       },
       big);
   EXPECT_EQ(decoded(out).pixels, expected.pixels);
+}
+
+// Hosts run an effect in place whenever its catalogue entry allows, to hold one picture in
+// memory: for every such entry, at every gallery setting, whole and under a selection, one
+// buffer must give what two give.
+TEST(Catalog, EffectsThatRunInPlaceGiveWhatTwoBuffersGive) {
+  const Image src = photo(kWidth, kHeight, 31);
+  fxcat::Selection sel;
+  fxcat::SelectionRequest rect;
+  rect.has_rect = true;
+  rect.rect = {3, 2, 9, 6};
+  ASSERT_EQ(fxcat::make_selection(rect, kWidth, kHeight, sel), "");
+  for (const fxcat::Effect& e : fxcat::effects()) {
+    if (!e.in_place || e.gallery == nullptr) continue;
+    for (std::string_view items = e.gallery;;) {
+      const std::string item(items.substr(0, items.find(';')));
+      SCOPED_TRACE(std::string(e.name) + " " + item);
+      fxcat::Settings settings;
+      fxcat::Values values;
+      ASSERT_EQ(fxcat::parse_settings(e, item, settings), "");
+      ASSERT_EQ(fxcat::resolve(e, settings, kWidth, kHeight, values), "");
+      const fxcat::Selection* const choices[] = {nullptr, &sel};
+      for (const fxcat::Selection* s : choices) {
+        if (fxcat::needs_two_buffers(e, s != nullptr)) continue;
+        Image two = src, one = src;
+        ASSERT_EQ(
+            fxcat::run_effect(e, values, src.pixels.data(), kWidth, kHeight, two.pixels.data(), s),
+            "");
+        ASSERT_EQ(
+            fxcat::run_effect(e, values, one.pixels.data(), kWidth, kHeight, one.pixels.data(), s),
+            "");
+        EXPECT_EQ(one.pixels, two.pixels) << (s != nullptr ? "under a selection" : "whole");
+      }
+      if (items.find(';') == std::string_view::npos) break;
+      items.remove_prefix(items.find(';') + 1);
+    }
+  }
+}
+
+// Hosts that take a chain as one string: commas that stand apart separate steps, commas inside
+// a word do not; options the chain does not know are refused without a host to take them.
+TEST(Catalog, ChainsWrittenAsOneStringSplitAtLoneCommas) {
+  EXPECT_EQ(fxcat::split_words(" brightness --level 13, contrast --rect 1,2,3,4 ,vintage"),
+            (std::vector<std::string>{"brightness", "--level", "13", ",", "contrast", "--rect",
+                                      "1,2,3,4", ",", "vintage"}));
+  std::vector<fxcat::Step> steps;
+  ASSERT_EQ(
+      fxcat::parse_chain(fxcat::split_words("brightness --level=13 , contrast --rect 1,2,3,4"),
+                         nullptr, steps),
+      "");
+  ASSERT_EQ(steps.size(), 2u);
+  EXPECT_EQ(steps[0].settings.values[0], 13);
+  EXPECT_EQ(steps[1].selection.rect.c, 3);
+  EXPECT_EQ(fxcat::parse_chain(fxcat::split_words("invert , sepia --out-dir x"), nullptr, steps),
+            "step 2 (sepia): sepia has no parameter --out-dir (it takes no parameters)");
 }
 
 }  // namespace

@@ -1,6 +1,6 @@
 // Twirl: the square-root and sine tables against <cmath>, the fixed points of the warp (angle 0,
-// the centre, the rim), the direction of the turn, the argument checks, fast mode's window, and
-// radii whose distances need more than 31 bits.
+// the centre, the rim), the direction of the turn, the argument checks, and radii whose distances
+// need more than 31 bits.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -120,31 +120,6 @@ TEST(Twirl, BadArgumentsWriteNothing) {
   EXPECT_EQ(dst, untouched);
   EXPECT_EQ(src, original);
   EXPECT_EQ(fx_twirl(src.data(), dst.data(), 8, 6, 4, 3, 1, 360, 0, 7, 0, 5, 0), PHOTOFX_SUCCESS);
-}
-
-// Fast mode fills 2 x 2 blocks from their top-left pixel, counted from the window's corner, and
-// writes nothing outside the window, even one reaching past every edge of an odd-sized image.
-TEST(Twirl, FastModeFillsBlocksInsideTheClippedWindowOnly) {
-  const int32_t w = 24, h = 21;
-  Pixels src = pfx::test::random_image(w, h, 23);
-  for (uint32_t& p : src) p = (p & 0xFFFFFFu) | 0x40000000u;
-  const pfx::Rect win{3, 18, 2, 14};
-  const Warped normal = twirl(src, w, h, 12, 10, 40, 150, win);
-  const Warped fast = twirl(src, w, h, 12, 10, 40, 150, win, 1);
-  for (int32_t y = 0; y < h; ++y) {
-    for (int32_t x = 0; x < w; ++x) {
-      const size_t i = static_cast<size_t>(y * w + x);
-      if (x < 3 || x > 18 || y < 2 || y > 14) {
-        ASSERT_EQ(fast.px[i], src[i]) << x << "," << y;
-      } else {
-        const int32_t ax = x - (x - 3) % 2, ay = y - (y - 2) % 2;
-        ASSERT_EQ(fast.px[i], normal.px[static_cast<size_t>(ay * w + ax)]) << x << "," << y;
-      }
-    }
-  }
-  const Warped wide = twirl(src, w, h, 12, 10, 40, 150, {-7, 1000, -3, 500}, 1);
-  EXPECT_EQ(wide.code, PHOTOFX_SUCCESS);
-  EXPECT_EQ(wide.px[static_cast<size_t>(h * w - 1)] >> 24, 0xFFu);
 }
 
 TEST(Twirl, LargeRadiiKeepEachPixelAtItsDistanceNearTheRim) {

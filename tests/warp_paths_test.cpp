@@ -122,6 +122,53 @@ TEST(WarpPaths, RandomCirclesAndWindowsMatchThePerPixelRules) {
   }
 }
 
+// Fast mode warps every second pixel of every second row, counted from the window's corner
+// (clipped to the image), and fills its whole 2 x 2 block: one past an odd-sized window's last
+// column and row, as far as the image reaches. The circles cover the image, so every block's
+// value is the plain warp's pixel at the block's corner.
+TEST(WarpPaths, FastModeFillsWholeBlocksHeldOnlyToTheImage) {
+  constexpr int32_t w = 21, h = 17;
+  const struct {
+    const char* what;
+    pfx::Rect window;
+  } windows[] = {
+      {"odd columns and rows: blocks one past the right and bottom", {4, 12, 3, 9}},
+      {"even columns and rows: nothing past them", {5, 14, 4, 11}},
+      {"ending one row above the last: its blocks reach the last row", {3, 10, 3, h - 2}},
+      {"touching the last column and row: the blocks are cut there", {2, w - 1, 0, h - 1}},
+      {"reaching past every edge: blocks from the image's corner", {-7, 1000, -3, 500}},
+  };
+  const Pixels src = pfx::test::random_image(w, h, 31);
+  for (const Warp warp : {Warp::kTwirl, Warp::kSphericity}) {
+    const bool t = warp == Warp::kTwirl;
+    const auto run = [&](pfx::Rect b, uint32_t fast) {
+      Pixels out(src.size(), 0xA5A5A5A5u);
+      if (t) {
+        fx_twirl(src.data(), out.data(), w, h, 10, 8, 40, 150, b.left, b.right, b.top, b.bottom,
+                 fast);
+      } else {
+        fx_sphericity(src.data(), out.data(), w, h, 10, 8, 20, 70, b.left, b.right, b.top, b.bottom,
+                      fast);
+      }
+      return out;
+    };
+    const Pixels plain = run({0, w - 1, 0, h - 1}, 0);
+    for (const auto& [what, win] : windows) {
+      const Pixels fast = run(win, 1);
+      const pfx::Rect b = pfx::clip_to_image(win, w, h);
+      for (int32_t y = 0; y < h; ++y) {
+        for (int32_t x = 0; x < w; ++x) {
+          const int32_t ax = x - (x - b.left) % 2, ay = y - (y - b.top) % 2;
+          const bool block = x >= b.left && ax <= b.right && y >= b.top && ay <= b.bottom;
+          const size_t i = static_cast<size_t>(y * w + x);
+          ASSERT_EQ(fast[i], block ? plain[static_cast<size_t>(ay * w + ax)] : src[i])
+              << (t ? "twirl, " : "sphericity, ") << what << ", at " << x << "," << y;
+        }
+      }
+    }
+  }
+}
+
 TEST(WarpPaths, DerivedTablesFollowTheirRules) {
   EXPECT_EQ(pfx::kInverse29[0], 0u);
   for (uint32_t i = 1; i < 4096; ++i) {

@@ -6,12 +6,14 @@
 #include <string_view>
 #include <vector>
 
+#include "catalog/params.h"
 #include "tools/font.h"
-#include "tools/params.h"
-#include "tools/selection.h"
 
 namespace fxtool {
 namespace {
+
+using fxcat::Settings;
+using fxcat::Values;
 
 // Contact-sheet layout: tiles of a thumbnail box over three caption lines (the effect's name and
 // up to two lines of settings). Eight columns keep a sheet of 80 or so tiles about as wide as it
@@ -196,7 +198,7 @@ std::string settings_text(const Effect& effect, const Values& values) {
     if (k > 0) text += ',';
     text.append(effect.params[k].name)
         .append("=")
-        .append(format_value(effect.params[k], values[k]));
+        .append(fxcat::format_value(effect.params[k], values[k]));
   }
   return text;
 }
@@ -233,10 +235,17 @@ std::string make_gallery(const Image& photo, const std::string& source, const st
       const std::string label = std::string(effect->name) + (item.empty() ? "" : " " + item);
       Settings settings;
       Values values;
-      std::string err = parse_settings(*effect, item, settings);
-      if (err.empty()) err = resolve(*effect, settings, photo.width, photo.height, values);
+      std::string err = fxcat::parse_settings(*effect, item, settings);
+      if (err.empty()) err = fxcat::resolve(*effect, settings, photo.width, photo.height, values);
       Image out;
-      if (err.empty()) err = run_effect(*effect, values, photo, nullptr, out);
+      if (err.empty()) {
+        err = fxcat::output_size(*effect, values, photo.width, photo.height, out.width, out.height);
+      }
+      if (err.empty()) {
+        out.resize(out.width, out.height);
+        err = fxcat::run_effect(*effect, values, photo.pixels.data(), photo.width, photo.height,
+                                out.pixels.data(), nullptr);
+      }
       const std::string file = picture_name(*effect, item);
       if (err.empty()) err = write_image(dir + "/" + file, out);
       if (!err.empty()) return label + ": " + err;

@@ -6,10 +6,12 @@
 #include <string>
 #include <vector>
 
-#include "tools/effect.h"
+#include "catalog/effects.h"
 #include "tools/image.h"
 
 namespace fxtool {
+
+using fxcat::Effect;
 
 // Writes into `dir` (which must exist): original.png, one EFFECT[-SETTINGS].png per picture,
 // contact-sheet.png and index.html. `source` names the photograph in the captions. Stops at the

@@ -1,8 +1,8 @@
-// photofx: the library's effects on PNG and JPEG files.
+// photofx: the library's effects on PNG, JPEG, WebP and TIFF files.
 //
-//   photofx list                           every effect with its parameters
-//   photofx apply EFFECT [options] IN OUT  one effect on one file
-//   photofx gallery [IN] [-o DIR]          every effect on one photograph
+//   photofx list                                  every effect with its parameters
+//   photofx apply STEP [, STEP]... [options] IN OUT   a chain of effects on a file (apply.cpp)
+//   photofx gallery [IN] [-o DIR]                 every effect on one photograph
 //
 // Exit status: 0 when everything was done, 1 when a file could not be read, processed or
 // written (the other files of the run are still done), 2 for a bad command line. Every problem
@@ -15,48 +15,63 @@
 #include <filesystem>
 #include <new>
 #include <set>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "tools/effect.h"
+#include "catalog/chain.h"
+#include "catalog/effects.h"
+#include "catalog/params.h"
+#include "photofx.h"
+#include "tools/cli.h"
 #include "tools/gallery.h"
 #include "tools/image.h"
-#include "tools/params.h"
 #include "tools/sample.h"
-#include "tools/selection.h"
 
 namespace fxtool {
-namespace {
 
-constexpr int kDone = 0;
-constexpr int kFailed = 1;
-constexpr int kUsage = 2;
-
-constexpr const char* kUsageText =
+const char* const kUsageText =
     "usage:\n"
-    "  photofx list\n"
-    "  photofx apply EFFECT [--PARAM VALUE]... [selection] IN OUT\n"
-    "  photofx apply EFFECT [--PARAM VALUE]... [selection] --out-dir DIR IN...\n"
+    "  photofx list                  every effect, its parameters and their ranges\n"
+    "  photofx help [EFFECT]         this text, or one effect explained\n"
+    "  photofx apply STEP [, STEP]... [options] IN OUT\n"
+    "  photofx apply STEP [, STEP]... [options] --out-dir DIR IN...\n"
     "  photofx gallery [IN] [-o DIR] [--only EFFECT,...]\n"
-    "  photofx help [EFFECT]\n"
+    "  photofx --version\n"
     "\n"
-    "Images are PNG or JPEG, read by content and written by the output's extension\n"
-    "(.png keeps alpha; .jpg and .jpeg drop it).\n"
+    "A STEP is an effect with its parameters (--level 13 or --level=13) and its\n"
+    "selection. Steps are separated by a lone ',' and run in order on the decoded\n"
+    "picture, which is encoded once at the end:\n"
+    "  photofx apply brightness --level 13 , contrast --level 12 ,\n"
+    "                vintage --ellipse 300,200,120,80 in.jpg out.jpg\n"
     "\n"
-    "selection (a pixel is edited when every option given selects it; none: the whole image):\n"
-    "  --mask FILE            greyscale image of the same size; grey 128 or more selects\n"
-    "                         (grey = (77 R + 150 G + 29 B) / 256, times alpha / 255)\n"
+    "selection (a pixel is edited when every option given selects it; none: all):\n"
     "  --rect X,Y,W,H         columns X..X+W-1, rows Y..Y+H-1\n"
     "  --ellipse CX,CY,RX,RY  centre and radii in pixels, edge included\n"
+    "  --mask FILE            an image of the same size: grey 128 or more selects\n"
+    "                         (grey = (77 R + 150 G + 29 B) / 256 x alpha / 255)\n"
     "\n"
+    "files: PNG, JPEG, WebP or TIFF, read by content, written by the extension of\n"
+    "OUT (.png, .jpg, .jpeg, .webp, .tif, .tiff). EXIF, ICC profile and XMP are\n"
+    "copied to the output.\n"
+    "  --quality N            JPEG and lossy WebP quality, 1..100 (92)\n"
+    "  --lossless             lossless WebP\n"
+    "  --strip                leave out EXIF, ICC profile and XMP\n"
+    "  --auto-orient          turn the picture upright by its EXIF orientation first\n"
+    "  --max-pixels N         refuse larger pictures unread (250000000)\n"
+    "\n"
+    "batches:\n"
     "  --out-dir DIR          write each IN to DIR under its own name\n"
-    "  --progress             a line per file even when stderr is not a terminal\n"
+    "  --format EXT           ... with this extension (png, jpg, webp, tif, ...)\n"
+    "  -j N, --jobs N         files at once (default: one per core)\n"
+    "  --progress             show progress even when stderr is not a terminal\n"
     "\n"
     "gallery: one PNG per effect setting, contact-sheet.png and index.html in DIR\n"
     "(default: gallery); without IN, the bundled sample photograph.\n"
     "\n"
-    "Exit status: 0 done, 1 a file could not be read, processed or written, 2 bad command line.\n";
+    "Exit status: 0 done, 1 a file could not be read, processed or written,\n"
+    "2 a bad command line.\n";
 
 void say(const std::string& message) { std::fprintf(stderr, "photofx: %s\n", message.c_str()); }
 
@@ -65,113 +80,11 @@ int usage_error(const std::string& message) {
   return kUsage;
 }
 
-// Splits "--name=value" or takes the next argument as the value.
-struct Arg {
-  std::string name;  // without dashes
-  std::string value;
-  bool has_value = false;
-};
-
-class ArgReader {
- public:
-  ArgReader(int argc, char** argv, int first) : args_(argv + first, argv + argc) {}
-
-  bool done() const { return pos_ >= args_.size(); }
-  const std::string& peek() const { return args_[pos_]; }
-  std::string next() { return args_[pos_++]; }
-
-  // The value of an option that needs one: after '=', else the following argument.
-  bool value_of(Arg& arg) {
-    if (arg.has_value) return true;
-    if (done()) return false;
-    arg.value = next();
-    arg.has_value = true;
-    return true;
-  }
-
- private:
-  std::vector<std::string> args_;
-  size_t pos_ = 0;
-};
-
-Arg split_option(const std::string& text) {
-  Arg a;
-  const size_t start = text.rfind("--", 0) == 0 ? 2 : 1;
-  const size_t eq = text.find('=');
-  a.name = text.substr(start, eq == std::string::npos ? std::string::npos : eq - start);
-  if (eq != std::string::npos) {
-    a.value = text.substr(eq + 1);
-    a.has_value = true;
-  }
-  return a;
-}
-
-bool is_option(const std::string& s) { return s.size() > 1 && s[0] == '-'; }
-
-// ---- list and help ----------------------------------------------------------------------------
-
-std::string param_list(const Effect& e) {
-  std::string s;
-  for (size_t k = 0; k < e.param_count(); ++k) {
-    s += std::string(k == 0 ? "" : "  ") + "--" + e.params[k].name + " " + describe(e.params[k]);
-  }
-  return s.empty() ? "(no parameters)" : s;
-}
-
-int list_effects() {
-  size_t name_width = 0, family_width = 0;
-  for (const Effect& e : effects()) {
-    name_width = std::max(name_width, std::string_view(e.name).size());
-    family_width = std::max(family_width, std::string_view(e.family).size());
-  }
-  for (const Effect& e : effects()) {
-    std::printf("%-*s  %-*s  %s  - %s\n", static_cast<int>(name_width), e.name,
-                static_cast<int>(family_width), e.family, param_list(e).c_str(), e.summary);
-  }
-  std::printf("\nW, H: the image's width and height; L: its longer side.\n");
-  return kDone;
-}
-
-int help_effect(const Effect& e) {
-  std::printf("%s (%s): %s\n", e.name, e.family, e.summary);
-  switch (e.selects) {
-    case Selects::kMask:
-      std::printf("selection: edited by the library's partial variant\n");
-      break;
-    case Selects::kByTool:
-      std::printf("selection: the whole image is edited, then only selected pixels are kept\n");
-      break;
-    case Selects::kNothing:
-      std::printf("selection: none (the effect changes the image's size)\n");
-      break;
-  }
-  for (size_t k = 0; k < e.param_count(); ++k) {
-    const Param& p = e.params[k];
-    std::printf("  --%-12s %-24s %s\n", p.name, describe(p).c_str(), p.help);
-  }
-  if (e.gallery != nullptr) std::printf("gallery: %s\n", e.gallery);
-  return kDone;
-}
-
-int help(ArgReader& args) {
-  if (args.done()) {
-    std::fputs(kUsageText, stdout);
-    return kDone;
-  }
-  const std::string name = args.next();
-  const Effect* e = find_effect(name);
-  if (e == nullptr) return usage_error("unknown effect '" + name + "' (photofx list shows them)");
-  return help_effect(*e);
-}
-
-// ---- apply ------------------------------------------------------------------------------------
-
 std::string base_name(const std::string& path) {
   const size_t slash = path.rfind('/');
   return slash == std::string::npos ? path : path.substr(slash + 1);
 }
 
-// Makes `dir` (and its parents) unless it exists.
 std::string make_directory(const std::string& dir) {
   std::error_code ec;
   std::filesystem::create_directories(dir, ec);
@@ -180,147 +93,85 @@ std::string make_directory(const std::string& dir) {
   return {};
 }
 
-// Reads one input, applies the effect and writes the output. Returns the reason for failure,
-// naming the file it concerns.
-std::string apply_one(const Effect& effect, const Settings& settings,
-                      const SelectionOptions& request, const std::string& in_path,
-                      const std::string& out_path) {
-  Image in;
-  if (std::string err = read_image(in_path, in); !err.empty()) return in_path + ": " + err;
-  Selection selection;
-  if (request.any()) {
-    if (std::string err = make_selection(request, in.width, in.height, selection); !err.empty()) {
-      return in_path + ": " + err;
+namespace {
+
+using fxcat::Effect;
+using fxcat::Param;
+using fxcat::Selects;
+
+bool is_option(const std::string& s) { return s.size() > 1 && s[0] == '-'; }
+
+// `text` in lines of at most `width` columns, broken at spaces; lines after the first are
+// indented by `indent`.
+std::string wrap(std::string_view text, size_t width, size_t indent, size_t column = 0) {
+  std::string out;
+  const size_t first = column;
+  while (!text.empty()) {
+    const size_t space = text.find(' ');
+    const std::string_view word = text.substr(0, space);
+    if (column > first && column + 1 + word.size() > width) {
+      out += '\n';
+      out.append(indent, ' ');
+      column = indent;
+    } else if (column > first) {
+      out += ' ';
+      ++column;
     }
+    out += word;
+    column += word.size();
+    if (space == std::string_view::npos) break;
+    text.remove_prefix(space + 1);
   }
-  Values values;
-  if (std::string err = resolve(effect, settings, in.width, in.height, values); !err.empty()) {
-    return in_path + ": " + err;
-  }
-  Image out;
-  if (std::string err = run_effect(effect, values, in, request.any() ? &selection : nullptr, out);
-      !err.empty()) {
-    return in_path + ": " + effect.name + ": " + err;
-  }
-  if (std::string err = write_image(out_path, out); !err.empty()) return out_path + ": " + err;
-  return {};
+  return out;
 }
 
-int apply(ArgReader& args) {
-  if (args.done()) return usage_error("apply needs an effect (photofx list shows them)");
-  const std::string name = args.next();
-  if (name == "--help" || name == "-h") {
+int version() {
+  std::printf("photofx %s (the command-line tool)\n", PHOTOFX_TOOL_VERSION);
+  std::printf("libphotofx %d.%d.%d\n", PHOTOFX_VERSION_MAJOR, PHOTOFX_VERSION_MINOR,
+              PHOTOFX_VERSION_PATCH);
+  std::printf("%s\n", codec_versions().c_str());
+  return kDone;
+}
+
+// ---- list and help ----------------------------------------------------------------------------
+
+std::string param_list(const Effect& e) {
+  std::string s;
+  for (size_t k = 0; k < e.param_count(); ++k) {
+    s += std::string(k == 0 ? "" : "  ") + "--" + e.params[k].name + " " +
+         fxcat::describe(e.params[k]);
+  }
+  return s.empty() ? "(no parameters)" : s;
+}
+
+int list_effects() {
+  size_t name_width = 0, family_width = 0;
+  for (const Effect& e : fxcat::effects()) {
+    name_width = std::max(name_width, std::string_view(e.name).size());
+    family_width = std::max(family_width, std::string_view(e.family).size());
+  }
+  for (const Effect& e : fxcat::effects()) {
+    std::printf("%-*s  %-*s  %s  - %s\n", static_cast<int>(name_width), e.name,
+                static_cast<int>(family_width), e.family, param_list(e).c_str(), e.summary);
+  }
+  std::printf("\nW, H: the image's width and height; L: its longer side.\n");
+  return kDone;
+}
+
+int help(fxcat::Words& args) {
+  if (args.done()) {
     std::fputs(kUsageText, stdout);
     return kDone;
   }
-  const Effect* effect = find_effect(name);
-  if (effect == nullptr)
-    return usage_error("unknown effect '" + name + "' (photofx list shows them)");
-
-  Settings settings;
-  SelectionOptions request;
-  std::string out_dir;
-  bool force_progress = false, options_done = false;
-  std::vector<std::string> files;
-  while (!args.done()) {
-    const std::string text = args.next();
-    if (options_done || !is_option(text)) {
-      files.push_back(text);
-      continue;
-    }
-    if (text == "--") {
-      options_done = true;
-      continue;
-    }
-    Arg opt = split_option(text);
-    if (opt.name == "help" || text == "-h") return help_effect(*effect);
-    if (opt.name == "progress" && !opt.has_value) {
-      force_progress = true;
-      continue;
-    }
-    if (text.rfind("--", 0) != 0) return usage_error("unknown option " + text);
-    if (!args.value_of(opt)) return usage_error("--" + opt.name + " needs a value");
-    std::string err;
-    if (opt.name == "mask") {
-      if (request.has_mask) return usage_error("--mask is given twice");
-      request.has_mask = true;
-      request.mask_path = opt.value;
-    } else if (opt.name == "rect") {
-      if (request.has_rect) return usage_error("--rect is given twice");
-      request.has_rect = true;
-      err = parse_rect(opt.value, request.rect);
-    } else if (opt.name == "ellipse") {
-      if (request.has_ellipse) return usage_error("--ellipse is given twice");
-      request.has_ellipse = true;
-      err = parse_ellipse(opt.value, request.ellipse);
-    } else if (opt.name == "out-dir") {
-      if (!out_dir.empty()) return usage_error("--out-dir is given twice");
-      out_dir = opt.value;
-      if (out_dir.empty()) err = "--out-dir needs a directory";
-    } else {
-      err = set_param(*effect, opt.name, opt.value, settings);
-    }
-    if (!err.empty()) return usage_error(err);
-  }
-
-  if (request.any() && effect->selects == Selects::kNothing) {
-    return usage_error(std::string(effect->name) +
-                       " takes no selection (it changes the image's size)");
-  }
-  std::vector<std::pair<std::string, std::string>> jobs;  // input, output
-  if (out_dir.empty()) {
-    if (files.size() != 2) {
-      return usage_error("apply needs IN and OUT, or --out-dir DIR and one or more inputs");
-    }
-    jobs.emplace_back(files[0], files[1]);
-  } else {
-    if (files.empty()) return usage_error("apply --out-dir needs one or more inputs");
-    std::set<std::string> seen;
-    for (const std::string& in : files) {
-      const std::string out = out_dir + "/" + base_name(in);
-      if (!seen.insert(out).second)
-        return usage_error("two inputs would both be written to " + out);
-      jobs.emplace_back(in, out);
-    }
-  }
-  for (const auto& job : jobs) {
-    if (format_of_name(job.second) == FileFormat::kUnknown) {
-      return usage_error(job.second + ": unknown image format (use .png, .jpg or .jpeg)");
-    }
-  }
-  const bool progress = force_progress || (!out_dir.empty() && isatty(STDERR_FILENO) != 0);
-
-  if (request.has_mask) {
-    if (std::string err = read_image(request.mask_path, request.mask_image); !err.empty()) {
-      say(request.mask_path + ": " + err);
-      return kFailed;
-    }
-  }
-  if (!out_dir.empty()) {
-    if (std::string err = make_directory(out_dir); !err.empty()) {
-      say(err);
-      return kFailed;
-    }
-  }
-
-  int status = kDone;
-  for (size_t i = 0; i < jobs.size(); ++i) {
-    if (progress) {
-      std::fprintf(stderr, "photofx: [%zu/%zu] %s -> %s\n", i + 1, jobs.size(),
-                   jobs[i].first.c_str(), jobs[i].second.c_str());
-    }
-    if (std::string err = apply_one(*effect, settings, request, jobs[i].first, jobs[i].second);
-        !err.empty()) {
-      say(err);
-      status = kFailed;
-    }
-  }
-  return status;
+  const std::string name = args.next();
+  const Effect* e = fxcat::find_effect(name);
+  if (e == nullptr) return usage_error("unknown effect '" + name + "' (photofx list shows them)");
+  return help_effect(*e);
 }
 
 // ---- gallery ----------------------------------------------------------------------------------
 
-int gallery(ArgReader& args) {
+int gallery(fxcat::Words& args) {
   std::string input, dir = "gallery", only;
   bool have_dir = false, have_only = false;
   while (!args.done()) {
@@ -330,14 +181,14 @@ int gallery(ArgReader& args) {
       input = text;
       continue;
     }
-    Arg opt = split_option(text);
+    fxcat::Option opt = fxcat::split_option(text);
     if (opt.name == "help" || text == "-h") {
       std::fputs(kUsageText, stdout);
       return kDone;
     }
     const bool is_dir = text == "-o" || opt.name == "out-dir";
     if (!is_dir && opt.name != "only") return usage_error("unknown option " + text);
-    if (!args.value_of(opt) || opt.value.empty()) return usage_error(text + " needs a value");
+    if (!args.take_value(opt) || opt.value.empty()) return usage_error(text + " needs a value");
     bool& have = is_dir ? have_dir : have_only;
     if (have) return usage_error(text + " is given twice");
     have = true;
@@ -346,13 +197,13 @@ int gallery(ArgReader& args) {
 
   std::vector<const Effect*> chosen;
   if (only.empty()) {
-    for (const Effect& e : effects()) chosen.push_back(&e);
+    for (const Effect& e : fxcat::effects()) chosen.push_back(&e);
   } else {
     std::string_view rest = only;
     while (true) {
       const size_t comma = rest.find(',');
       const std::string name(rest.substr(0, comma));
-      const Effect* e = find_effect(name);
+      const Effect* e = fxcat::find_effect(name);
       if (e == nullptr) return usage_error("unknown effect '" + name + "' in --only");
       chosen.push_back(e);
       if (comma == std::string_view::npos) break;
@@ -389,16 +240,61 @@ int run(int argc, char** argv) {
     return kUsage;
   }
   const std::string command = argv[1];
-  ArgReader args(argc, argv, 2);
+  const std::vector<std::string> words(argv + 2, argv + argc);
+  fxcat::Words args(words);
   if (command == "list")
     return args.done() ? list_effects() : usage_error("list takes no arguments");
-  if (command == "apply") return apply(args);
+  if (command == "apply") return apply(words);
   if (command == "gallery") return gallery(args);
   if (command == "help" || command == "--help" || command == "-h") return help(args);
+  if (command == "--version" || command == "version") {
+    return args.done() ? version() : usage_error(command + " takes no arguments");
+  }
   return usage_error("unknown command '" + command + "'");
 }
 
 }  // namespace
+
+int help_effect(const fxcat::Effect& e) {
+  constexpr size_t kColumns = 80;
+  std::printf("%s\n",
+              wrap(std::string(e.name) + " (" + e.family + "): " + e.summary, kColumns, 2).c_str());
+  const char* how = "";
+  switch (e.selects) {
+    case Selects::kMask:
+      how = "edited by the library's partial variant";
+      break;
+    case Selects::kKeep:
+      how = "the whole picture is edited, then only the selected pixels are kept";
+      break;
+    case Selects::kNothing:
+      how = "none (the effect changes the picture's size)";
+      break;
+  }
+  std::printf("%s\n", wrap(std::string("selection: ") + how, kColumns, 2).c_str());
+  if (e.state != fxcat::State::kNone) {
+    std::printf("%s\n", wrap("uses the library's module-wide state: never runs at the same time "
+                             "as another effect that does",
+                             kColumns, 2)
+                            .c_str());
+  }
+  // "  --name RANGE" then the help, indented under it when the two do not fit on one line.
+  for (size_t k = 0; k < e.param_count(); ++k) {
+    const Param& p = e.params[k];
+    std::string head = std::string("  --") + p.name + " " + fxcat::describe(p);
+    constexpr size_t kHelpColumn = 40;
+    if (head.size() + 1 > kHelpColumn) {
+      head += "\n" + std::string(kHelpColumn, ' ');
+    } else {
+      head += std::string(kHelpColumn - head.size(), ' ');
+    }
+    std::printf("%s%s\n", head.c_str(), wrap(p.help, kColumns, kHelpColumn, kHelpColumn).c_str());
+  }
+  if (e.gallery != nullptr)
+    std::printf("%s\n", wrap(std::string("gallery: ") + e.gallery, kColumns, 2).c_str());
+  return kDone;
+}
+
 }  // namespace fxtool
 
 int main(int argc, char** argv) {

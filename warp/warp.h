@@ -234,8 +234,10 @@ constexpr uint64_t isqrt(uint64_t n) {
 //
 // samples(y, x0, step, n, out) fills out[i] with the warped value of pixel (x0 + step * i, y),
 // each inside the circle. Fast mode samples every second column of the chord on every second
-// row and fills the 2 x 2 block right of and below each sample, as far as it lies inside the
-// window. Neighbours are read from src only, so the order of the writes does not matter.
+// row and fills the whole 2 x 2 block right of and below each sample, dropping only what falls
+// outside the image: a block that starts on the window's last column or row reaches one past
+// it, so a window previewed in fast mode has no seam of unwarped pixels along its right and
+// bottom edges. Neighbours are read from src only, so the order of the writes does not matter.
 template <class Samples>
 void warp_circle(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height, Rect window,
                  bool fast, int32_t cx, int32_t cy, uint64_t limit, Samples&& samples) {
@@ -274,8 +276,10 @@ void warp_circle(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
       continue;
     }
     const int32_t n = (last - first) / 2 + 1;
-    const int32_t end = first + 2 * (n - 1) + 1 > w.right ? w.right : first + 2 * (n - 1) + 1;
-    const bool below = y + 1 <= w.bottom;
+    // The blocks end one past the last sample, held to the image (last <= width - 1, so the
+    // sum cannot overflow).
+    const int32_t end = first + 2 * (n - 1) + 1 > width - 1 ? width - 1 : first + 2 * (n - 1) + 1;
+    const bool below = y + 1 < height;
     copy_around(y, first, end);
     if (below) copy_around(y + 1, first, end);
     constexpr int32_t kChunk = 512;
@@ -289,8 +293,8 @@ void warp_circle(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
         row[x] = value[i];
         if (below) row[stride + x] = value[i];
       }
-      // The right half of each block, where the window reaches it.
-      const int32_t whole = x0 + 2 * (m - 1) + 1 <= w.right ? m : m - 1;
+      // The right half of each block, where the image reaches it.
+      const int32_t whole = x0 + 2 * (m - 1) + 1 <= width - 1 ? m : m - 1;
       for (int32_t i = 0; i < whole; ++i) {
         const size_t x = static_cast<size_t>(x0) + 2 * static_cast<size_t>(i) + 1;
         row[x] = value[i];

@@ -57,7 +57,8 @@ inline uint32_t sample(const uint32_t* src, int32_t width, int32_t height, const
 }
 
 // Every pixel of the window (clipped to the image) in turn; fast mode fills 2 x 2 blocks from
-// every second warped pixel of every second row. dst starts as a copy of src.
+// every second warped pixel of every second row, each whole as far as the image reaches, even
+// one past the window. dst starts as a copy of src.
 template <class Locate>
 void warp_window(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height, int32_t left,
                  int32_t right, int32_t top, int32_t bottom, bool fast, const Locate& locate) {
@@ -84,9 +85,9 @@ void warp_window(const uint32_t* src, uint32_t* dst, int32_t width, int32_t heig
         ++x;
         continue;
       }
-      if (x + 1 <= right) row[i + 1] = value;
-      if (y + 1 <= bottom) row[stride + i] = value;
-      if (x + 1 <= right && y + 1 <= bottom) row[stride + i + 1] = value;
+      if (x + 1 < width) row[i + 1] = value;
+      if (y + 1 < height) row[stride + i] = value;
+      if (x + 1 < width && y + 1 < height) row[stride + i + 1] = value;
       x += 2;
     }
   }

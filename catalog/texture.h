@@ -1,14 +1,14 @@
-// A paper texture for the textured old-photo look, made up by the tool rather than read from a
-// file: a warm light ground with broad soft blotches, fine grain and a few thin light scratches
-// running down the sheet. It is computed in integers from the pixel's position alone, so the
+// A paper texture for the textured old-photo look, made up here rather than read from a file: a
+// warm light ground with broad soft blotches, fine grain and a few thin light scratches running
+// down the sheet. It is computed in integers from the pixel's position alone, so the
 // same size always gives the same texture, on every machine.
 #pragma once
 
 #include <cstdint>
 
-#include "tools/image.h"
+#include "catalog/effects.h"
 
-namespace fxtool {
+namespace fxcat {
 
 namespace paper {
 
@@ -37,10 +37,11 @@ constexpr uint32_t channel(int32_t v) {
 
 }  // namespace paper
 
-inline Image paper_texture(int32_t width, int32_t height) {
+// width x height pixels of paper (nothing for an empty size).
+inline Pixels paper_texture(int32_t width, int32_t height) {
   using namespace paper;
-  Image t;
-  t.resize(width, height);
+  if (width <= 0 || height <= 0) return {};
+  Pixels t(static_cast<size_t>(width) * static_cast<size_t>(height));
   for (int32_t y = 0; y < height; ++y) {
     const int32_t cy = y / kCell, fy = y % kCell;
     for (int32_t x = 0; x < width; ++x) {
@@ -54,11 +55,12 @@ inline Image paper_texture(int32_t width, int32_t height) {
       // About one column in 97 carries a scratch, broken into dashes of 16 rows.
       const bool scratch = hash(ux, 0, 3) % 97 == 0 && (hash(ux, uy / 16, 4) & 3) != 0;
       const int32_t shade = blotch + grain + (scratch ? 60 : 0);
-      t.at(x, y) = 0xFF000000u | channel(208 + shade) << 16 | channel(190 + shade) << 8 |
-                   channel(160 + shade);
+      t[static_cast<size_t>(y) * static_cast<size_t>(width) + static_cast<size_t>(x)] =
+          0xFF000000u | channel(208 + shade) << 16 | channel(190 + shade) << 8 |
+          channel(160 + shade);
     }
   }
   return t;
 }
 
-}  // namespace fxtool
+}  // namespace fxcat

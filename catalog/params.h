@@ -7,9 +7,9 @@
 #include <string>
 #include <string_view>
 
-#include "tools/effect.h"
+#include "catalog/effects.h"
 
-namespace fxtool {
+namespace fxcat {
 
 // Settings given for one effect (on the command line or by a gallery item), already parsed and
 // checked as far as they can be without an image.
@@ -43,4 +43,4 @@ std::string describe(const Param& p);
 // A value as the user would write it: a number, or a choice's label.
 std::string format_value(const Param& p, double value);
 
-}  // namespace fxtool
+}  // namespace fxcat

@@ -1,5 +1,5 @@
 // Parsing and checking effect parameters.
-#include "tools/params.h"
+#include "catalog/params.h"
 
 #include <algorithm>
 #include <charconv>
@@ -8,7 +8,7 @@
 #include <numeric>
 #include <string>
 
-namespace fxtool {
+namespace fxcat {
 namespace {
 
 std::string format_number(double v) {
@@ -196,4 +196,4 @@ std::string format_value(const Param& p, double value) {
   return format_number(value);
 }
 
-}  // namespace fxtool
+}  // namespace fxcat

@@ -1,11 +1,11 @@
-// Building selections and running effects through them.
-#include "tools/selection.h"
+// Building selections from their shapes.
+#include "catalog/selection.h"
 
 #include <algorithm>
 #include <charconv>
 #include <string>
 
-namespace fxtool {
+namespace fxcat {
 namespace {
 
 // Four comma-separated whole numbers.
@@ -57,24 +57,24 @@ std::string parse_ellipse(std::string_view text, Shape& out) {
   return {};
 }
 
-bool mask_selects(uint32_t pixel) {
-  const uint32_t r = (pixel >> 16) & 0xFF, g = (pixel >> 8) & 0xFF, b = pixel & 0xFF;
-  const uint32_t grey = (77 * r + 150 * g + 29 * b) >> 8;
-  return grey * (pixel >> 24) >= kMaskThreshold * 255;
-}
-
-std::string make_selection(const SelectionOptions& request, int32_t width, int32_t height,
+std::string make_selection(const SelectionRequest& request, int32_t width, int32_t height,
                            Selection& out) {
+  if (width <= 0 || height <= 0 || int64_t{width} * height > kMaxPixels) {
+    return "the image has no pixels or too many";
+  }
   const size_t w = static_cast<size_t>(width);
-  out.mask.assign(w * static_cast<size_t>(height), 1);
+  const size_t n = w * static_cast<size_t>(height);
 
-  if (request.has_mask) {
-    const Image& m = request.mask_image;
+  if (request.mask.bytes != nullptr) {
+    const MaskRef& m = request.mask;
     if (m.width != width || m.height != height) {
-      return "the mask " + request.mask_path + " is " + image_size(m.width, m.height) +
-             " but the image is " + image_size(width, height);
+      return "the mask " + m.name + " is " + image_size(m.width, m.height) + " but the image is " +
+             image_size(width, height);
     }
-    for (size_t i = 0; i < out.mask.size(); ++i) out.mask[i] = mask_selects(m.pixels[i]) ? 1 : 0;
+    out.mask.resize(n);
+    for (size_t i = 0; i < n; ++i) out.mask[i] = m.bytes[i] != 0 ? 1 : 0;
+  } else {
+    out.mask.assign(n, 1);
   }
 
   if (request.has_rect) {
@@ -129,36 +129,4 @@ std::string make_selection(const SelectionOptions& request, int32_t width, int32
   return {};
 }
 
-std::string run_effect(const Effect& effect, const Values& values, const Image& in,
-                       const Selection* selection, Image& out) {
-  if (effect.run == nullptr) return std::string(effect.name) + " has no run function";
-  if (selection != nullptr && effect.selects == Selects::kNothing) {
-    return std::string(effect.name) + " takes no selection";
-  }
-  out = in;
-  const Bounds whole_image{0, in.width - 1, 0, in.height - 1};
-  const bool partial = selection != nullptr && effect.selects == Selects::kMask;
-  std::vector<uint8_t> ones;
-  if (!partial) ones.assign(in.pixels.size(), 1);
-  const Call call{.in = in,
-                  .out = out,
-                  .mask = partial ? selection->mask.data() : ones.data(),
-                  .bounds = partial ? selection->box : Bounds{1, 0, 1, 0},
-                  .window = selection != nullptr ? selection->box : whole_image,
-                  .whole = !partial,
-                  .values = values};
-  if (std::string err = effect.run(call); !err.empty()) return err;
-
-  if (effect.selects == Selects::kNothing) return {};
-  if (out.width != in.width || out.height != in.height || out.pixels.size() != in.pixels.size()) {
-    return std::string(effect.name) + " changed the image size";
-  }
-  if (selection != nullptr && effect.selects == Selects::kByTool) {
-    for (size_t i = 0; i < out.pixels.size(); ++i) {
-      if (selection->mask[i] == 0) out.pixels[i] = in.pixels[i];
-    }
-  }
-  return {};
-}
-
-}  // namespace fxtool
+}  // namespace fxcat

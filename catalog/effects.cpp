@@ -1,13 +1,22 @@
-// The registry: one entry per effect the command-line tool offers. See tools/effect.h for what
-// each field means; the table is checked when it is compiled (names, ranges, defaults).
+// The catalogue: one entry per effect the hosts offer. See catalog/effects.h for what each field
+// means; the table is checked when it is compiled (names, ranges, defaults).
+#include "catalog/effects.h"
+
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
+#include <sys/mman.h>
+#endif
+
+#include <cstdlib>
+#include <cstring>
+#include <mutex>
 #include <string>
 #include <string_view>
 
+#include "catalog/chain.h"
+#include "catalog/texture.h"
 #include "photofx.h"
-#include "tools/effect.h"
-#include "tools/texture.h"
 
-namespace fxtool {
+namespace fxcat {
 namespace {
 
 // ---- Shared parameters and helpers ----------------------------------------------------------
@@ -50,20 +59,31 @@ class AutoAdjustSettings {
   int32_t threshold_, cutoff_, weight1_, weight2_;
 };
 
-// Mirror: the library names the output size, the tool allocates it, the library fills it.
-std::string mirror(const Call& c) {
-  const int32_t mode = c.arg(2), axis = c.arg(3);
-  const int32_t pos = axis == MIRROR_HORIZONTAL ? c.arg(0) : c.arg(1);
-  const int32_t w = getMirrorOutwidth(c.width(), pos, mode, axis);
-  const int32_t h = getMirrorOutheight(c.height(), pos, mode, axis);
-  if (int64_t{w} * h > kMaxPixels) return "the mirrored image would be too large";
-  c.out.resize(w, h);
-  const int32_t code = runMirror(c.src(), c.width(), c.height(), c.dst(), w, h, pos, mode, axis);
-  if (code == PHOTOFX_INVALID_ARGUMENT) {
+// Mirror: the library names the output size, the host allocates it, the library fills it.
+int32_t mirror_position(const Values& v) {
+  return static_cast<int32_t>(static_cast<int32_t>(v[3]) == MIRROR_HORIZONTAL ? v[0] : v[1]);
+}
+
+std::string mirror_size(const Values& v, int32_t width, int32_t height, int32_t& out_width,
+                        int32_t& out_height) {
+  const int32_t pos = mirror_position(v);
+  const int32_t mode = static_cast<int32_t>(v[2]), axis = static_cast<int32_t>(v[3]);
+  // The library would refuse a side that does not belong to the axis when it runs; say so
+  // before anything is allocated for it.
+  const bool keeps_column_side = mode == MIRROR_KEEP_LEFT || mode == MIRROR_KEEP_RIGHT;
+  if (keeps_column_side != (axis == MIRROR_HORIZONTAL)) {
     return "the library refused the arguments (keep-left and keep-right go with --axis "
            "horizontal, keep-top and keep-bottom with --axis vertical)";
   }
-  return result_code(code);
+  out_width = getMirrorOutwidth(width, pos, mode, axis);
+  out_height = getMirrorOutheight(height, pos, mode, axis);
+  if (int64_t{out_width} * out_height > kMaxPixels) return "the mirrored image would be too large";
+  return {};
+}
+
+std::string mirror(const Call& c) {
+  return result_code(runMirror(c.src, c.width, c.height, c.dst, c.out_width, c.out_height,
+                               mirror_position(c.values), c.arg(2), c.arg(3)));
 }
 
 constexpr Choice kChannels[] = {{"all", 0}, {"red", 1}, {"green", 2}, {"blue", 3}};
@@ -76,15 +96,15 @@ std::string levels(const Call& c) {
   return full_only<Levels>(c);
 }
 
-// The textured old photo mixes in a texture of the picture's size: the tool's own paper.
+// The textured old photo mixes in a texture of the picture's size: the catalogue's own paper.
 std::string old_photo_texture(const Call& c) {
-  const Image paper = paper_texture(c.width(), c.height());
+  const Pixels paper = paper_texture(c.width, c.height);
   const Bounds& b = c.bounds;
   if (c.whole) {
-    fx_apply_oldphoto_texture(c.src(), c.dst(), paper.pixels.data(), c.width(), c.height());
+    fx_apply_oldphoto_texture(c.src, c.dst, paper.data(), c.width, c.height);
   } else {
-    fx_apply_oldphoto_texture_partial(c.src(), c.dst(), paper.pixels.data(), c.mask, c.width(),
-                                      c.height(), b.left, b.right, b.top, b.bottom);
+    fx_apply_oldphoto_texture_partial(c.src, c.dst, paper.data(), c.mask, c.width, c.height, b.left,
+                                      b.right, b.top, b.bottom);
   }
   return {};
 }
@@ -94,8 +114,8 @@ std::string old_photo_texture(const Call& c) {
 template <auto Warp>
 std::string circle_warp(const Call& c) {
   const Bounds& w = c.window;
-  Warp(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.arg(1), c.arg(2), c.arg(3), w.left,
-       w.right, w.top, w.bottom, static_cast<uint32_t>(c.arg(4)));
+  Warp(c.src, c.dst, c.width, c.height, c.arg(0), c.arg(1), c.arg(2), c.arg(3), w.left, w.right,
+       w.top, w.bottom, static_cast<uint32_t>(c.arg(4)));
   return {};
 }
 
@@ -106,7 +126,8 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "lighter or darker: moves the luma and keeps the colour",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .params = {integer("level", 0, 20, 10, "slider position; 10 keeps the luma, though the "
+                        "YCbCr round trip still moves most colours a step")},
      .run = full_and_partial<controlBrightness, controlBrightnessPartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
     {.name = "contrast",
@@ -127,7 +148,8 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "warmer above 10 (more red, less blue), cooler below",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .params = {integer("level", 0, 20, 10, "slider position; 10 shifts no chroma, though the "
+                        "YCbCr round trip still moves most colours a step")},
      .run = full_and_partial<controlTemperature, controlTemperaturePartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
     {.name = "exposure",
@@ -162,41 +184,41 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "a slider per channel: a step adds 6 to its channel and takes 3 from the others",
      .selects = Selects::kMask,
-     .params = {integer("red", 0, 20, 10, "red slider; 10 leaves the channel as it is"),
-                integer("green", 0, 20, 10, "green slider; 10 leaves the channel as it is"),
-                integer("blue", 0, 20, 10, "blue slider; 10 leaves the channel as it is")},
+     .params = {integer("red", 0, 20, 10, "red slider; 10 moves no channel"),
+                integer("green", 0, 20, 10, "green slider; 10 moves no channel"),
+                integer("blue", 0, 20, 10, "blue slider; 10 moves no channel")},
      .run = full_and_partial<controlAdjustRGB, AdjustRGB>,
      .gallery = "red=20;green=20;blue=20;red=14,green=12,blue=4"},
     {.name = "colour-tone",
      .family = "adjust",
      .summary = "repaints the picture in one hue at low saturation",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {integer("hue", 0, 360, 30, "the hue in degrees: 0 red, 120 green, 240 blue")},
      .run = full_only<fx_change_colortone>,
      .gallery = "hue=30;hue=200"},
     {.name = "lighten",
      .family = "adjust",
      .summary = "brush: lightens a disc, most at its centre; the disc becomes opaque",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
                 integer("strength", 0, 255, 64, "how much the centre's channels rise"),
                 length("radius", 1, 250, "the disc's radius in pixels")},
      .run = [](const Call& c) {
-       rubLighten(c.dst(), c.arg(0), c.arg(1), c.width(), c.height(), c.arg(2), c.arg(3));
+       rubLighten(c.dst, c.arg(0), c.arg(1), c.width, c.height, c.arg(2), c.arg(3));
        return std::string();
      },
      .gallery = ";strength=255"},
     {.name = "darken",
      .family = "adjust",
      .summary = "brush: darkens a disc, most at its centre; the disc becomes opaque",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
                 integer("strength", 0, 255, 64, "how much the centre's channels fall"),
                 length("radius", 1, 250, "the disc's radius in pixels")},
      .run = [](const Call& c) {
-       rubDarken(c.dst(), c.arg(0), c.arg(1), c.width(), c.height(), c.arg(2), c.arg(3));
+       rubDarken(c.dst, c.arg(0), c.arg(1), c.width, c.height, c.arg(2), c.arg(3));
        return std::string();
      },
      .gallery = ";strength=255"},
@@ -209,7 +231,7 @@ constexpr Effect kEffects[] = {
      .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
      .run = [](const Call& c) {
        const Bounds& b = c.bounds;
-       applyBlur(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(0), b.left, b.right,
+       applyBlur(c.src, c.mask, c.dst, c.width, c.height, c.arg(0), b.left, b.right,
                  b.top, b.bottom);
        return std::string();
      },
@@ -218,11 +240,12 @@ constexpr Effect kEffects[] = {
      .family = "blur",
      .summary = "the same blur through a preview session, as an editor's slider runs it",
      .selects = Selects::kMask,
+     .state = State::kBlurWorkspace,
      .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
      .run = [](const Call& c) {
        const Bounds& b = c.bounds;
-       fx_Init_blur(c.src(), c.mask, c.width(), c.height(), b.left, b.right, b.top, b.bottom);
-       fx_make_blur_preview(c.src(), c.mask, c.dst(), c.width(), c.height(), c.arg(0));
+       fx_Init_blur(c.src, c.mask, c.width, c.height, b.left, b.right, b.top, b.bottom);
+       fx_make_blur_preview(c.src, c.mask, c.dst, c.width, c.height, c.arg(0));
        fx_destroy_blur();
        return std::string();
      },
@@ -230,7 +253,7 @@ constexpr Effect kEffects[] = {
     {.name = "tilt-shift",
      .family = "blur",
      .summary = "a sharp horizontal band, the picture blurring away above and below it",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {row("centre", 500, "the row in the middle of the sharp band"),
                 rows("half-height", 125, "rows kept sharp on each side of the centre")},
      .run = full_only<applyTiltShift>,
@@ -238,12 +261,13 @@ constexpr Effect kEffects[] = {
     {.name = "tilt-shift-preview",
      .family = "blur",
      .summary = "the same tilt-shift through a preview session",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
+     .state = State::kBlurWorkspace,
      .params = {row("centre", 500, "the row in the middle of the sharp band"),
                 rows("half-height", 125, "rows kept sharp on each side of the centre")},
      .run = [](const Call& c) {
-       initTiltShift(c.src(), c.width(), c.height());
-       makeTiltShift(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.arg(1));
+       initTiltShift(c.src, c.width, c.height);
+       makeTiltShift(c.src, c.dst, c.width, c.height, c.arg(0), c.arg(1));
        destroyTiltShift();
        return std::string();
      },
@@ -259,9 +283,9 @@ constexpr Effect kEffects[] = {
      .run = [](const Call& c) {
        const Bounds& b = c.bounds;
        if (c.whole) {
-         fx_apply_sharpen_all(c.src(), c.dst(), c.width(), c.height());
+         fx_apply_sharpen_all(c.src, c.dst, c.width, c.height);
        } else {
-         applySharpen(c.src(), c.mask, c.dst(), c.width(), c.height(), 0, b.left, b.right, b.top,
+         applySharpen(c.src, c.mask, c.dst, c.width, c.height, 0, b.left, b.right, b.top,
                       b.bottom);
        }
        return std::string();
@@ -270,32 +294,32 @@ constexpr Effect kEffects[] = {
     {.name = "pixelize",
      .family = "retouch",
      .summary = "a mosaic of square blocks, each the colour of its top-left pixel",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {integer("shift", 0, 31, 3, "blocks of 2^shift pixels a side; 0 changes nothing")},
      .run = full_only<applyPixelize>,
      .gallery = "shift=3;shift=5"},
     {.name = "pixelize-brush",
      .family = "retouch",
      .summary = "brush: the same mosaic inside a disc, on the grid of the whole picture",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {integer("shift", 0, 31, 4, "blocks of 2^shift pixels a side; 0 changes nothing"),
                 column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
                 length("radius", 0, 250, "the disc's radius in pixels")},
      .run = [](const Call& c) {
-       rubPixelize(c.dst(), c.width(), c.height(), c.arg(0), c.arg(1), c.arg(2), c.arg(3));
+       rubPixelize(c.dst, c.width, c.height, c.arg(0), c.arg(1), c.arg(2), c.arg(3));
        return std::string();
      },
      .gallery = ""},
     {.name = "red-eye",
      .family = "retouch",
      .summary = "takes the red out of strongly red pixels inside a square",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {column("cx", 500, "the square's centre column"),
                 row("cy", 500, "the square's centre row"),
                 length("radius", 0, 250, "half the square's side in pixels")},
      .run = [](const Call& c) {
-       removeRedeye(c.dst(), c.width(), c.height(), c.arg(0), c.arg(1), c.arg(2));
+       removeRedeye(c.dst, c.width, c.height, c.arg(0), c.arg(1), c.arg(2));
        return std::string();
      },
      .gallery = ""},
@@ -304,18 +328,18 @@ constexpr Effect kEffects[] = {
     {.name = "gamma",
      .family = "curves",
      .summary = "mid-tones lighter above 1, darker below; black and white stay",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
                 real("gamma", 0.1, 10, 1, "the curve's power is 1 / gamma; 1 changes nothing")},
      .run = [](const Call& c) {
-       control_gamma(c.src(), c.dst(), c.width(), c.height(), c.arg(0), c.real(1));
+       control_gamma(c.src, c.dst, c.width, c.height, c.arg(0), c.real(1));
        return std::string();
      },
      .gallery = "gamma=0.6;gamma=1.8;channel=blue,gamma=2.5"},
     {.name = "input-levels",
      .family = "curves",
      .summary = "stretches low..high over the whole range: more contrast, the ends clipped",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
                 integer("low", 0, 255, 0, "the value that becomes 0"),
                 integer("high", 0, 255, 255, "the value that becomes 255; above low")},
@@ -324,7 +348,7 @@ constexpr Effect kEffects[] = {
     {.name = "output-levels",
      .family = "curves",
      .summary = "squeezes the whole range into low..high: less contrast",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
                 integer("low", 0, 255, 0, "what 0 becomes"),
                 integer("high", 0, 255, 255, "what 255 becomes; above low")},
@@ -349,14 +373,14 @@ constexpr Effect kEffects[] = {
     {.name = "vignette",
      .family = "looks",
      .summary = "darkens toward the borders: to 9/16 at their middles, about 1/8 in the corners",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {},
      .run = full_only<fx_apply_vignette>,
      .gallery = ""},
     {.name = "vignette-preview",
      .family = "looks",
      .summary = "the table-based vignette for previews: steeper, about 0 in the corners",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {},
      .run = full_only<fx_apply_vignette_prev>,
      .gallery = ""},
@@ -370,7 +394,7 @@ constexpr Effect kEffects[] = {
     {.name = "vintage-preview",
      .family = "looks",
      .summary = "a one-pass stand-in for the vintage look, for previews",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {},
      .run = full_only<fx_apply_vintage_prev>,
      .gallery = ""},
@@ -391,14 +415,14 @@ constexpr Effect kEffects[] = {
     {.name = "pop-art",
      .family = "looks",
      .summary = "four half-size copies, each posterised in its own colours",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {},
      .run = full_only<applyPopArt>,
      .gallery = ""},
     {.name = "pop-art-preview",
      .family = "looks",
      .summary = "four half-size copies, each turned to its own hue, for previews",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
      .params = {},
      .run = full_only<fx_apply_popart_prev>,
      .gallery = ""},
@@ -427,6 +451,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: faded and auto-adjusted, soft and dim; takes auto adjust's parameters",
      .selects = Selects::kMask,
+     .state = State::kAutoAdjust,
      .params = {kThreshold, kCutOff, kWeight1, kWeight2},
      .run = [](const Call& c) {
        const AutoAdjustSettings settings(c, 0);
@@ -460,17 +485,20 @@ constexpr Effect kEffects[] = {
      .family = "warp",
      .summary = "keeps one side of a column or row and adds its reflection; changes the size",
      .selects = Selects::kNothing,
+     .in_place = false,  // the warps read source pixels after writing destination ones
      .params = {column("column", 500, "the mirror column, with --axis horizontal"),
                 row("row", 500, "the mirror row, with --axis vertical"),
                 choice("mode", kMirrorModes, 0, "the side kept: left or right of the column, "
                        "top or bottom of the row"),
                 choice("axis", kMirrorAxes, 0, "reflect across a column or a row")},
      .run = mirror,
+     .size = mirror_size,
      .gallery = "mode=keep-left;mode=keep-bottom,axis=vertical"},
     {.name = "sphericity",
      .family = "warp",
      .summary = "bulges (level above 0) or pinches (below 0) a circle of about 1.4 x radius",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
+     .in_place = false,  // the warps read source pixels after writing destination ones
      .params = {column("cx", 500, "the circle's centre column"),
                 row("cy", 500, "the circle's centre row"),
                 length("radius", 1, 250, "the nominal radius in pixels"),
@@ -481,7 +509,8 @@ constexpr Effect kEffects[] = {
     {.name = "twirl",
      .family = "warp",
      .summary = "turns a circle by an angle that is largest at its centre and fades to its rim",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
+     .in_place = false,  // the warps read source pixels after writing destination ones
      .params = {column("cx", 500, "the circle's centre column"),
                 row("cy", 500, "the circle's centre row"),
                 length("radius", 1, 400, "the circle's radius in pixels"),
@@ -495,11 +524,12 @@ constexpr Effect kEffects[] = {
     {.name = "auto-adjust",
      .family = "auto",
      .summary = "tone mapping from the picture's histogram (contrast 12 under 150 pixels a side)",
-     .selects = Selects::kByTool,
+     .selects = Selects::kKeep,
+     .state = State::kAutoAdjust,
      .params = {kThreshold, kCutOff, kWeight1, kWeight2},
      .run = [](const Call& c) {
        const AutoAdjustSettings settings(c, 0);
-       return result_code(applyAutoAdjust(c.src(), c.dst(), c.width(), c.height()));
+       return result_code(applyAutoAdjust(c.src, c.dst, c.width, c.height));
      },
      .gallery = ";cutoff=85,weight1=4000"},
 };
@@ -523,12 +553,9 @@ constexpr bool is_option_name(const char* s) {
   return last != '-';
 }
 
-// The tool's own options; an effect parameter must not take one of these names.
-constexpr const char* kReserved[] = {"mask", "rect", "ellipse", "out-dir", "progress", "help"};
-
 constexpr bool param_ok(const Param& p) {
   if (!is_option_name(p.name) || p.help == nullptr || p.help[0] == '\0') return false;
-  for (const char* r : kReserved) {
+  for (const char* r : kHostOptions) {
     if (same(p.name, r)) return false;
   }
   switch (p.kind) {
@@ -603,4 +630,105 @@ std::string result_code(int32_t code) {
   }
 }
 
-}  // namespace fxtool
+// ---- Pixel memory ---------------------------------------------------------------------------
+
+namespace detail {
+
+// Below this a buffer takes ordinary pages; above it, 2 MB pages where Linux has them on
+// request (transparent huge pages in "madvise" mode, the common default).
+constexpr size_t kHugePage = size_t{2} << 20;
+constexpr size_t kHugeFrom = 4 * kHugePage;
+
+void* allocate_pixels(size_t bytes) {
+  void* p = nullptr;
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
+  if (bytes >= kHugeFrom) {
+    if (posix_memalign(&p, kHugePage, bytes) != 0) throw std::bad_alloc();
+    madvise(p, bytes, MADV_HUGEPAGE);  // a hint: without it the pages are merely small
+    return p;
+  }
+#endif
+  p = std::malloc(bytes == 0 ? 1 : bytes);
+  if (p == nullptr) throw std::bad_alloc();
+  return p;
+}
+
+void free_pixels(void* p, size_t) noexcept { std::free(p); }
+
+}  // namespace detail
+
+// ---- Running ------------------------------------------------------------------------------
+
+std::string output_size(const Effect& effect, const Values& values, int32_t width, int32_t height,
+                        int32_t& out_width, int32_t& out_height) {
+  out_width = width;
+  out_height = height;
+  if (effect.size == nullptr) return {};
+  return effect.size(values, width, height, out_width, out_height);
+}
+
+bool needs_two_buffers(const Effect& effect, bool selected) {
+  return effect.size != nullptr || !effect.in_place ||
+         (selected && effect.selects == Selects::kKeep);
+}
+
+namespace {
+
+// One lock per kind of module-wide state (State::kNone needs none).
+std::mutex& state_lock(State state) {
+  static std::mutex locks[3];
+  return locks[static_cast<size_t>(state)];
+}
+
+}  // namespace
+
+std::string run_effect(const Effect& effect, const Values& values, const uint32_t* src,
+                       int32_t width, int32_t height, uint32_t* dst, const Selection* selection) {
+  if (effect.run == nullptr) return std::string(effect.name) + " has no run function";
+  if (selection != nullptr && effect.selects == Selects::kNothing) {
+    return std::string(effect.name) + " takes no selection";
+  }
+  if (width <= 0 || height <= 0 || int64_t{width} * height > kMaxPixels) {
+    return "the image has no pixels or too many";
+  }
+  const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
+  if (selection != nullptr && selection->mask.size() != n)
+    return "the selection is not the image's size";
+  if (src == dst && needs_two_buffers(effect, selection != nullptr)) {
+    return std::string(effect.name) + " needs an output buffer apart from its input";
+  }
+  int32_t out_width = 0, out_height = 0;
+  if (std::string err = output_size(effect, values, width, height, out_width, out_height);
+      !err.empty()) {
+    return err;
+  }
+  // Same-size effects start from the source in dst (the brushes edit it there).
+  if (effect.size == nullptr && src != dst) std::memcpy(dst, src, n * sizeof(uint32_t));
+  const bool partial = selection != nullptr && effect.selects == Selects::kMask;
+  const Bounds whole_image{0, width - 1, 0, height - 1};
+  const Call call{.src = src,
+                  .dst = dst,
+                  .width = width,
+                  .height = height,
+                  .out_width = out_width,
+                  .out_height = out_height,
+                  .mask = partial ? selection->mask.data() : nullptr,
+                  .bounds = partial ? selection->box : Bounds{1, 0, 1, 0},
+                  .window = selection != nullptr ? selection->box : whole_image,
+                  .whole = !partial,
+                  .values = values};
+  {
+    std::unique_lock<std::mutex> lock;
+    if (effect.state != State::kNone) lock = std::unique_lock(state_lock(effect.state));
+    if (std::string err = effect.run(call); !err.empty()) return err;
+  }
+  if (selection != nullptr && effect.selects == Selects::kKeep) {
+    const uint8_t* m = selection->mask.data();
+    for (size_t i = 0; i < n; ++i) {
+      if (m[i] == 0) dst[i] = src[i];
+    }
+  }
+  return {};
+}
+
+}  // namespace fxcat
