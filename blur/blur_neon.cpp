@@ -526,6 +526,47 @@ bool restore_row(const uint32_t* src, uint32_t* dst, int32_t width, int32_t sw, 
   return true;
 }
 
+// ---- Sharpen ------------------------------------------------------------------------------
+
+// Eight pixels at a time from column 1: the left and right neighbours by extracting from the
+// blocks on either side (the source's, kept in registers, so the call may work in place), then
+// clamp(2c - ((l + r) >> 1)) per channel: the halving add is the mean exactly, and 2c - mean
+// lies in -255..510.
+size_t sharpen_row(const uint32_t* src, const uint8_t* mask, uint32_t* dst, size_t w,
+                   uint32_t& left) {
+  if (w < 18) return 1;
+  const uint8_t* in = reinterpret_cast<const uint8_t*>(src);
+  uint8_t* out = reinterpret_cast<uint8_t*>(dst);
+  // prev holds the eight source columns before the block (only its last lane is read), cur the
+  // block's, next the eight after it.
+  const uint8x8x4_t first = vld4_u8(in);
+  uint8x8x4_t prev;
+  for (int32_t c = 0; c < 4; ++c) prev.val[c] = vdup_lane_u8(first.val[c], 0);
+  uint8x8x4_t cur = vld4_u8(in + 4);  // columns 1..8
+  uint32_t last = src[0];
+  size_t x = 1;
+  for (; x + 16 <= w; x += 8) {
+    const uint8x8x4_t next = vld4_u8(in + 4 * (x + 8));
+    uint8x8x4_t res = cur;
+    for (int32_t c = 0; c < 3; ++c) {
+      const uint8x8_t l = vext_u8(prev.val[c], cur.val[c], 7);
+      const uint8x8_t r = vext_u8(cur.val[c], next.val[c], 1);
+      const uint8x8_t mean = vhadd_u8(l, r);
+      res.val[c] = vqmovun_s16(vreinterpretq_s16_u16(vsubw_u8(vshll_n_u8(cur.val[c], 1), mean)));
+    }
+    if (mask != nullptr) {
+      const uint8x8_t selected = vceq_u8(vld1_u8(mask + x), vdup_n_u8(1));
+      for (int32_t c = 0; c < 3; ++c) res.val[c] = vbsl_u8(selected, res.val[c], cur.val[c]);
+    }
+    last = src[x + 7];  // before the store overwrites it, when in place
+    vst4_u8(out + 4 * x, res);
+    prev = cur;
+    cur = next;
+  }
+  left = last;
+  return x;
+}
+
 }  // namespace pfx::neon
 
 #endif

@@ -29,4 +29,9 @@ PFX_NEON_KERNEL(bool composite_row(const uint32_t*, const uint8_t*, uint32_t*, i
 PFX_NEON_KERNEL(bool restore_row(const uint32_t*, uint32_t*, int32_t, int32_t, int32_t, int32_t,
                                  const uint16_t* const*))
 
+// The middle of a sharpened row of w >= 2 pixels (sharpen.cpp), in place or not: the pixels from
+// column 1 up to the returned column, which the caller goes on from with `left`, the source
+// pixel before it.
+PFX_NEON_KERNEL(size_t sharpen_row(const uint32_t*, const uint8_t*, uint32_t*, size_t, uint32_t&))
+
 }  // namespace pfx::neon

@@ -205,12 +205,6 @@ const Case kCases[] = {
     {.name = "fx_apply_tiltshift", .width = 30, .height = 500, .call = tilt<fx_apply_tiltshift>},
     {.name = "applyTiltShift", .width = 30, .height = 500, .call = tilt<applyTiltShift>},
     {.name = "make_tiltshift", .width = 40, .height = 30, .call = tiltshift_of_work},
-    // Sharpen.
-    {.name = "fx_apply_sharpen_all", .width = 23, .height = 17, .call = full<fx_apply_sharpen_all>},
-    {.name = "fx_apply_sharpen", .width = 23, .height = 17,
-     .call = partial_level<fx_apply_sharpen, 10>},
-    {.name = "applySharpen", .width = 23, .height = 17, .call = partial_level<applySharpen, 10>,
-     .whole = true},
     // Preset compositing: downlight (the other looks are made pixel by pixel, without scratch).
     {.name = "fx_apply_downlight_partial_masked", .width = 512, .height = 300,
      .call = partial<fx_apply_downlight_partial>, .degrades_from = 2,

@@ -1,7 +1,7 @@
-// Shapes that only some vector paths take, against the plain forms in reference/: upscaling from
-// working images exactly 2, 4 and 8 times narrower (the NEON rows then repeat one pattern per
-// block of eight), with and without a selection, into a second buffer and in place. The ARM
-// builds run this with and without their vector paths.
+// Shapes that only some vector paths take, against plain forms: upscaling from working images
+// exactly 2, 4 and 8 times narrower (the NEON rows then repeat one pattern per block of eight),
+// and sharpening rows long enough for the NEON blocks, with and without a selection, into a
+// second buffer and in place. The ARM builds run this with and without their vector paths.
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -57,6 +57,43 @@ TEST(VectorPaths, UpscalingFromPowerOfTwoWorkingSizes) {
                       1);
     ASSERT_EQ(got, want) << "restore";
     ASSERT_EQ(in_place, want) << "restore in place";
+  }
+}
+
+// Sharpen as its rule reads: every channel clamp(2c - ((left + right) >> 1)), the first and last
+// columns kept, and with a mask only where its byte is 1.
+Pixels sharpened(const Pixels& img, const Mask* mask, int32_t w) {
+  Pixels out = img;
+  for (size_t i = 0; i < img.size(); ++i) {
+    const int32_t x = static_cast<int32_t>(i % static_cast<size_t>(w));
+    if (x == 0 || x == w - 1 || (mask != nullptr && (*mask)[i] != 1)) continue;
+    uint32_t p = img[i] & 0xFF000000u;
+    for (int32_t shift = 0; shift < 24; shift += 8) {
+      const auto c = [&](size_t j) { return static_cast<int32_t>((img[j] >> shift) & 255u); };
+      const int32_t v = 2 * c(i) - ((c(i - 1) + c(i + 1)) >> 1);
+      p |= static_cast<uint32_t>(v < 0 ? 0 : (v > 255 ? 255 : v)) << shift;
+    }
+    out[i] = p;
+  }
+  return out;
+}
+
+TEST(VectorPaths, SharpenOnLongRows) {
+  for (const int32_t w : {17, 18, 24, 25, 61}) {
+    SCOPED_TRACE(w);
+    const int32_t h = 3;
+    const Pixels img = pfx::test::random_image(w, h, 800 + w);
+    const Mask mask = pfx::test::random_mask(w, h, 900 + w);
+    Pixels out(img.size(), kUntouched), in_place = img;
+    fx_apply_sharpen_all(img.data(), out.data(), w, h);
+    fx_apply_sharpen_all(in_place.data(), in_place.data(), w, h);
+    ASSERT_EQ(out, sharpened(img, nullptr, w));
+    ASSERT_EQ(in_place, out);
+    in_place = img;
+    fx_apply_sharpen(img.data(), mask.data(), out.data(), w, h, 0, 0, 0, 0, 0);
+    fx_apply_sharpen(in_place.data(), mask.data(), in_place.data(), w, h, 0, 0, 0, 0, 0);
+    ASSERT_EQ(out, sharpened(img, &mask, w));
+    ASSERT_EQ(in_place, out);
   }
 }
 
