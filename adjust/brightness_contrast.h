@@ -5,6 +5,7 @@
 #include <cstdint>
 
 #include "adjust/ycbcr.h"
+#include "frame/divide.h"
 #include "frame/pixel.h"
 
 namespace pfx {
@@ -36,9 +37,9 @@ class Brightness {
 // negative), never across it: below-mid values stay in 0..128, the others in 128..255.
 //
 // Written without the table so that it vectorises. With a = |c - 128| (0..128) the step is
-// (a + 9) / 10 in size, and ((a + 9) * 205) >> 11 is that quotient for every a up to 1028. The
-// channel's new distance from 128, a + d * step, is held to 0..128 below the middle and to
-// 0..127 above it, which is the table rule's hold at 0 and 128, or 128 and 255.
+// (a + 9) / 10 in size, made by a multiplication (frame/divide.h). The channel's new distance
+// from 128, a + d * step, is held to 0..128 below the middle and to 0..127 above it, which is the
+// table rule's hold at 0 and 128, or 128 and 255.
 class Contrast {
  public:
   explicit constexpr Contrast(int32_t level) : d_(level_steps(level)) {}
@@ -46,7 +47,7 @@ class Contrast {
   constexpr int32_t channel(int32_t c) const {
     const int32_t u = c - 128;
     const int32_t a = u < 0 ? -u : u;
-    const int32_t step = ((a + 9) * 205) >> 11;
+    const int32_t step = contrast_step(a);
     const int32_t m = a + d_ * step;
     return u < 0 ? 128 - clamp_to(m, 0, 128) : 128 + clamp_to(m, 0, 127);
   }

@@ -8,6 +8,8 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "frame/simd_path.h"
+
 #if defined(__x86_64__) && defined(__GNUC__) && !defined(PHOTOFX_NO_CLONES)
 #include <immintrin.h>
 #define PFX_BYTE_PERMUTES 1
@@ -69,10 +71,12 @@ __attribute__((target("avx512f,avx512bw,avx512vbmi"))) void map_channels_vbmi(co
   map_channels_scalar(map, src + i, dst + i, n - i);
 }
 
+// Part of the AVX-512 path, where the CPU has them: the portable and AVX2 paths look pixels up
+// one at a time, or work the rule out per pixel (channel_map_is_fast).
 bool has_byte_permutes() {
   static const bool has =
       __builtin_cpu_supports("avx512vbmi") != 0 && __builtin_cpu_supports("avx512bw") != 0;
-  return has;
+  return has && simd_path() == SimdPath::kAvx512;
 }
 
 #endif

@@ -3,6 +3,7 @@
 
 #include <cstdint>
 
+#include "frame/divide.h"
 #include "frame/pixel.h"
 
 namespace pfx {
@@ -41,13 +42,6 @@ class Fade {
  private:
   static constexpr Line line(int32_t k, int32_t o, int32_t level) {
     return {255 * (100 - level) + k * level, o * level};
-  }
-
-  // x / 25500 for 0 <= x < 2^23, by a multiplication that vectorises where a division does not:
-  // with M = ceil(2^37 / 25500) = 5389763, M * 25500 - 2^37 = 3028 is below 2^(37 - 23), so
-  // x * M / 2^37 exceeds x / 25500 by less than 1 / 25500 and never reaches the next integer.
-  static constexpr int32_t quotient_25500(uint32_t x) {
-    return static_cast<int32_t>((uint64_t{x} * 5389763u) >> 37);
   }
 
   Line red_, green_, blue_;

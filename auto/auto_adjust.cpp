@@ -85,7 +85,7 @@ struct Histogram {
 // Counts the lightness levels of n pixels into count[0..100] (level 0 included). The levels of a
 // block are worked out first, in a loop the compiler vectorises; the counting is split four ways
 // so that a run of one level does not wait on its own increments.
-PFX_VECTOR_CLONES void count_levels(const uint32_t* src, size_t n, uint32_t count[kLevels]) {
+void count_levels_loop(const uint32_t* src, size_t n, uint32_t count[kLevels]) {
   constexpr size_t kBlock = 1024;
   uint32_t split[4][kLevels] = {};
   uint8_t level[kBlock];
@@ -105,6 +105,10 @@ PFX_VECTOR_CLONES void count_levels(const uint32_t* src, size_t n, uint32_t coun
   for (int32_t l = 0; l < kLevels; ++l) {
     count[l] = split[0][l] + split[1][l] + split[2][l] + split[3][l];
   }
+}
+
+void count_levels(const uint32_t* src, size_t n, uint32_t count[kLevels]) {
+  vector_paths([&] { count_levels_loop(src, n, count); });
 }
 
 Histogram measure(const uint32_t* src, size_t n) {
@@ -182,12 +186,17 @@ constexpr uint32_t apply_gain(uint32_t p, uint32_t gain) {
 
 // Second pass with the gain table. Each pixel is read before its own word is written, so dst
 // may be src.
-PFX_VECTOR_CLONES void map_by_table(const uint32_t* src, uint32_t* dst, size_t n,
-                                    const uint32_t* __restrict gain) {
+void map_by_table_loop(const uint32_t* src, uint32_t* dst, size_t n,
+                       const uint32_t* __restrict gain) {
+  PFX_NO_ALIAS_LOOP
   for (size_t i = 0; i < n; ++i) {
     const uint32_t p = src[i];
     dst[i] = apply_gain(p, gain[luma_of(p)]);
   }
+}
+
+void map_by_table(const uint32_t* src, uint32_t* dst, size_t n, const uint32_t* gain) {
+  vector_paths([&] { map_by_table_loop(src, dst, n, gain); });
 }
 
 // Second pass dividing per pixel, for images too small to pay for the table (or when its memory

@@ -1,27 +1,58 @@
 // The effects the suite times: one entry per public effect, in the order the report lists them.
 //
-// Adding an effect is one entry. The common shapes need no code of their own, e.g.
+// Adding an effect is one entry. An export of the catalogue (catalog/exports.h) runs through its
+// row, at the row's typical levels, e.g.
 //
 //   {.name = "soft-glow", .goal = kHsvGoal, .peer = Peer::kHsv,
-//    .full = full<applySoftglow, 60>, .partial = partial<applySoftglowPartial, 60>},
+//    .full = row<at("applySoftglow")>, .partial = row<at("applySoftglowPartial")>},
 //
-// full<F, levels...> calls F(src, dst, width, height, levels...) (levels may be doubles, as for
-// control_gamma); partial<F, levels...> calls F(src, mask, dst, width, height, levels..., left,
-// right, top, bottom), with the ellipse's box as bounds. Any other shape is a small function over
-// the Frame: see the blur, the textured old photo, the warps and the brushes below.
+// with empty bounds for the full run and the ellipse's box for the partial one, a brush stroke
+// around the middle of the picture, the tilt-shift band a little above it. Work on the blur's
+// working images and other placements are small functions over the Frame below.
 //
-// Pick levels that change the image: the suite refuses a call that leaves its output equal to the
-// photograph (a refused argument would otherwise time as a fast no-op); set .changes = false only
-// where the picture may legitimately come back unchanged. `goal` is the goal for the
+// The typical levels change the image: the suite refuses a call that leaves its output equal to
+// the photograph (a refused argument would otherwise time as a fast no-op); set .changes = false
+// only where the picture may legitimately come back unchanged. `goal` is the goal for the
 // effect's kind (suite.h), `peer` the OpenCV work nearest to it.
 #include <cmath>
 #include <cstdint>
+#include <string_view>
 
 #include "bench/suite.h"
+#include "catalog/exports.h"
 #include "photofx.h"
 
 namespace fxbench {
 namespace {
+
+namespace cat = pfx::catalog;
+
+consteval size_t at(std::string_view name) { return cat::index_of(name); }
+
+int32_t brush_radius(const Frame& f);
+int32_t band_centre(const Frame& f);
+int32_t band_half(const Frame& f);
+
+// The frame as the arguments of a catalogue row, at the row's typical levels.
+cat::Args args_of(const cat::Export& e, const Frame& f) {
+  cat::Args a;
+  a.src = f.src, a.dst = f.dst, a.mask = f.mask, a.texture = f.src;
+  a.width = f.width, a.height = f.height;
+  if (!e.reps.empty()) {
+    for (int i = 0; i < 4; ++i) a.level[i] = e.reps[0].v[i];
+    a.real = e.reps[0].real;
+  }
+  a.bounds = {f.left, f.right, f.top, f.bottom};
+  a.cx = f.width / 2, a.cy = f.height / 2, a.radius = brush_radius(f);
+  a.centre = band_centre(f), a.half_height = band_half(f);
+  return a;
+}
+
+template <size_t Row>
+void row(const Frame& f) {
+  const cat::Export& e = cat::kExports[Row];
+  e.call(args_of(e, f));
+}
 
 // ---- Brushes: a stroke the size a finger makes on a phone showing the whole photograph -------
 
@@ -36,18 +67,12 @@ int64_t eye_area(const Frame& f) { return square(eye_radius(f)); }
 // ---- Blur and tilt-shift -------------------------------------------------------------------
 
 // The frame's bounds choose the mode: whole image for full runs, the ellipse for partial ones.
-void init_blur(const Frame& f) {
-  fx_Init_blur(f.src, f.mask, f.width, f.height, f.left, f.right, f.top, f.bottom);
-}
+void init_blur(const Frame& f) { row<at("fx_Init_blur")>(f); }
 
 // A workspace whose blurred copy holds a real blur, for the compositing kernels.
 void init_blurred(const Frame& f) {
   init_blur(f);
   fx_make_blur_preview(f.src, f.mask, f.dst, f.width, f.height, 4);
-}
-
-void blur_preview(const Frame& f) {
-  fx_make_blur_preview(f.src, f.mask, f.dst, f.width, f.height, 8);
 }
 
 // The working-image kernels write their bytes into the destination buffer, which is larger.
@@ -69,15 +94,7 @@ void blur_composite(const Frame& f) {
 int32_t band_centre(const Frame& f) { return f.height * 9 / 20; }
 int32_t band_half(const Frame& f) { return f.height / 8; }
 
-void tilt_init(const Frame& f) { initTiltShift(f.src, f.width, f.height); }
-
-void tilt_preview(const Frame& f) {
-  makeTiltShift(f.src, f.dst, f.width, f.height, band_centre(f), band_half(f));
-}
-
-void tilt_oneshot(const Frame& f) {
-  applyTiltShift(f.src, f.dst, f.width, f.height, band_centre(f), band_half(f));
-}
+void tilt_init(const Frame& f) { row<at("initTiltShift")>(f); }
 
 void tilt_gaussian_working(const Frame& f) {
   make_tiltshift(g_ssrc, out_bytes(f), g_scaled_wd, g_scaled_ht);
@@ -94,33 +111,13 @@ void tilt_composite(const Frame& f) {
                     band_centre(f), band_half(f));
 }
 
-// ---- Brushes, in place around the middle of the picture ---------------------------------------
-
-void lighten(const Frame& f) {
-  rubLighten(f.dst, f.width / 2, f.height / 2, f.width, f.height, 64, brush_radius(f));
-}
-
-void darken(const Frame& f) {
-  rubDarken(f.dst, f.width / 2, f.height / 2, f.width, f.height, 64, brush_radius(f));
-}
-
-void pixelize_brush(const Frame& f) {
-  rubPixelize(f.dst, f.width, f.height, 4, f.width / 2, f.height / 2, brush_radius(f));
-}
+// ---- The red-eye brush, in place a third of the way in ------------------------------------------
 
 void red_eye(const Frame& f) {
-  removeRedeye(f.dst, f.width, f.height, f.width / 3, f.height / 3, eye_radius(f));
-}
-
-// ---- The textured old photo, with the photograph as its own texture ---------------------------
-
-void old_photo_texture(const Frame& f) {
-  fx_apply_oldphoto_texture(f.src, f.dst, f.src, f.width, f.height);
-}
-
-void old_photo_texture_partial(const Frame& f) {
-  fx_apply_oldphoto_texture_partial(f.src, f.dst, f.src, f.mask, f.width, f.height, f.left, f.right,
-                                    f.top, f.bottom);
+  const cat::Export& e = cat::kExports[at("removeRedeye")];
+  cat::Args a = args_of(e, f);
+  a.cx = f.width / 3, a.cy = f.height / 3, a.radius = eye_radius(f);
+  e.call(a);
 }
 
 // ---- Warps over the whole picture --------------------------------------------------------
@@ -130,15 +127,20 @@ int32_t half_diagonal(const Frame& f) {
   return static_cast<int32_t>(std::ceil(std::hypot(f.width, f.height) / 2));
 }
 
+// A circle warp around the middle, over the whole picture.
+void warp(const cat::Export& e, const Frame& f, int32_t radius, uint32_t fast) {
+  cat::Args a = args_of(e, f);
+  a.radius = radius, a.fast = fast, a.bounds = {0, f.width - 1, 0, f.height - 1};
+  e.call(a);
+}
+
 void twirl(const Frame& f, uint32_t fast) {
-  runTwirl(f.src, f.dst, f.width, f.height, f.width / 2, f.height / 2, half_diagonal(f), 90, 0,
-           f.width - 1, 0, f.height - 1, fast);
+  warp(cat::kExports[at("runTwirl")], f, half_diagonal(f), fast);
 }
 
 // The sphericity's circle is about 1.4 times its radius.
 void sphericity(const Frame& f, uint32_t fast) {
-  runSphericity(f.src, f.dst, f.width, f.height, f.width / 2, f.height / 2,
-                half_diagonal(f) * 5 / 7 + 1, 50, 0, f.width - 1, 0, f.height - 1, fast);
+  warp(cat::kExports[at("runSphericity")], f, half_diagonal(f) * 5 / 7 + 1, fast);
 }
 
 // Mirrors about the middle, so that the output has the source's size and fits dst.
@@ -153,72 +155,72 @@ void mirror(const Frame& f, int32_t mode, int32_t axis) {
 constexpr Effect kEffects[] = {
     // ---- Point operations ------------------------------------------------------------------
     {.name = "invert", .goal = kPointGoal, .peer = Peer::kBitwiseNot,
-     .full = full<applyInvert>, .partial = partial<applyInvertPartial>},
+     .full = row<at("applyInvert")>, .partial = row<at("applyInvertPartial")>},
     {.name = "brightness", .goal = kPointGoal, .peer = Peer::kTransform,
-     .full = full<controlBrightness, 14>, .partial = partial<controlBrightnessPartial, 14>},
+     .full = row<at("controlBrightness")>, .partial = row<at("controlBrightnessPartial")>},
     {.name = "contrast", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<controlContrast, 14>, .partial = partial<controlContrastPartial, 14>},
+     .full = row<at("controlContrast")>, .partial = row<at("controlContrastPartial")>},
     {.name = "saturation", .goal = kPointGoal, .peer = Peer::kTransform,
-     .full = full<controlSaturation, 14>, .partial = partial<controlSaturationPartial, 14>},
+     .full = row<at("controlSaturation")>, .partial = row<at("controlSaturationPartial")>},
     {.name = "temperature", .goal = kPointGoal, .peer = Peer::kTransform,
-     .full = full<controlTemperature, 14>, .partial = partial<controlTemperaturePartial, 14>},
+     .full = row<at("controlTemperature")>, .partial = row<at("controlTemperaturePartial")>},
     {.name = "exposure", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<controlExposure, 14>, .partial = partial<controlExposurePartial, 14>},
+     .full = row<at("controlExposure")>, .partial = row<at("controlExposurePartial")>},
     {.name = "faded-colour", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<controlFadedColour, 50>, .partial = partial<controlFadedColourPartial, 50>},
+     .full = row<at("controlFadedColour")>, .partial = row<at("controlFadedColourPartial")>},
     {.name = "channel-gains", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<controlAdjustRGB, 14, 12, 8>, .partial = partial<AdjustRGB, 14, 12, 8>},
+     .full = row<at("controlAdjustRGB")>, .partial = row<at("AdjustRGB")>},
     {.name = "greyscale", .goal = kPointGoal, .peer = Peer::kTransform,
-     .full = full<controlGreyscale, 12>, .partial = partial<controlGreyscalePartial, 12>},
+     .full = row<at("controlGreyscale")>, .partial = row<at("controlGreyscalePartial")>},
     {.name = "sepia", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<fx_apply_sepia>, .partial = partial<fx_apply_sepia_partial>},
-    {.name = "gamma", .goal = kPointGoal, .peer = Peer::kLut, .full = full<control_gamma, 0, 0.77>},
+     .full = row<at("fx_apply_sepia")>, .partial = row<at("fx_apply_sepia_partial")>},
+    {.name = "gamma", .goal = kPointGoal, .peer = Peer::kLut, .full = row<at("control_gamma")>},
     {.name = "levels-input", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<changeHistogramByInput, 0, 28, 255>},
+     .full = row<at("changeHistogramByInput")>},
     {.name = "levels-output", .goal = kPointGoal, .peer = Peer::kLut,
-     .full = full<changeHistogramByOutput, 0, 45, 255>},
+     .full = row<at("changeHistogramByOutput")>},
 
     // ---- HSV-based effects -----------------------------------------------------------------
     {.name = "hue", .goal = kHsvGoal, .peer = Peer::kHsv,
-     .full = full<controlHue, 14>, .partial = partial<controlHuePartial, 14>},
+     .full = row<at("controlHue")>, .partial = row<at("controlHuePartial")>},
     {.name = "colour-tone", .goal = kHsvGoal, .peer = Peer::kHsv,
-     .full = full<fx_change_colortone, 30>},
+     .full = row<at("fx_change_colortone")>},
     {.name = "pop-art-preview", .goal = kHsvGoal, .peer = Peer::kHsv,
-     .full = full<fx_apply_popart_prev>},
+     .full = row<at("fx_apply_popart_prev")>},
     {.name = "soft-glow", .goal = kHsvGoal, .peer = Peer::kHsv,
-     .full = full<applySoftglow, 60>, .partial = partial<applySoftglowPartial, 60>},
+     .full = row<at("applySoftglow")>, .partial = row<at("applySoftglowPartial")>},
 
     // ---- Film looks ------------------------------------------------------------------------
-    {.name = "vignette", .full = full<fx_apply_vignette>},
-    {.name = "vignette-preview", .full = full<fx_apply_vignette_prev>},
-    {.name = "vintage", .full = full<applyVintage>, .partial = partial<applyVintagePartial>},
-    {.name = "vintage-preview", .full = full<fx_apply_vintage_prev>},
-    {.name = "old-photo", .full = full<applyOldPhoto>, .partial = partial<applyOldPhotoPartial>},
-    {.name = "old-photo-texture", .full = old_photo_texture,
-     .partial = old_photo_texture_partial},
-    {.name = "pop-art", .full = full<applyPopArt>},
+    {.name = "vignette", .full = row<at("fx_apply_vignette")>},
+    {.name = "vignette-preview", .full = row<at("fx_apply_vignette_prev")>},
+    {.name = "vintage", .full = row<at("applyVintage")>, .partial = row<at("applyVintagePartial")>},
+    {.name = "vintage-preview", .full = row<at("fx_apply_vintage_prev")>},
+    {.name = "old-photo", .full = row<at("applyOldPhoto")>, .partial = row<at("applyOldPhotoPartial")>},
+    {.name = "old-photo-texture", .full = row<at("fx_apply_oldphoto_texture")>,
+     .partial = row<at("fx_apply_oldphoto_texture_partial")>},
+    {.name = "pop-art", .full = row<at("applyPopArt")>},
 
     // ---- Preset looks (downlight runs auto adjust inside: no chain goal) and auto adjust ---
-    {.name = "retro", .goal = kPresetGoal, .full = full<applyRetro>,
-     .partial = partial<applyRetroPartial>},
-    {.name = "sunshine", .goal = kPresetGoal, .full = full<applySunshine>,
-     .partial = partial<applySunshinePartial>},
-    {.name = "bluewash", .goal = kPresetGoal, .full = full<applyBluewash>,
-     .partial = partial<applyBluewashPartial>},
-    {.name = "nostalgia", .goal = kPresetGoal, .full = full<applyNostalgia>,
-     .partial = partial<applyNostalgiaPartial>},
-    {.name = "yellowglow", .goal = kPresetGoal, .full = full<applyYellowglow>,
-     .partial = partial<applyYellowglowPartial>},
-    {.name = "downlight", .full = full<applyDownlight>, .partial = partial<applyDownlightPartial>},
-    {.name = "auto-adjust", .goal = kAutoGoal, .full = full<applyAutoAdjust>},
+    {.name = "retro", .goal = kPresetGoal, .full = row<at("applyRetro")>,
+     .partial = row<at("applyRetroPartial")>},
+    {.name = "sunshine", .goal = kPresetGoal, .full = row<at("applySunshine")>,
+     .partial = row<at("applySunshinePartial")>},
+    {.name = "bluewash", .goal = kPresetGoal, .full = row<at("applyBluewash")>,
+     .partial = row<at("applyBluewashPartial")>},
+    {.name = "nostalgia", .goal = kPresetGoal, .full = row<at("applyNostalgia")>,
+     .partial = row<at("applyNostalgiaPartial")>},
+    {.name = "yellowglow", .goal = kPresetGoal, .full = row<at("applyYellowglow")>,
+     .partial = row<at("applyYellowglowPartial")>},
+    {.name = "downlight", .full = row<at("applyDownlight")>, .partial = row<at("applyDownlightPartial")>},
+    {.name = "auto-adjust", .goal = kAutoGoal, .full = row<at("applyAutoAdjust")>},
 
     // ---- Neighbourhood effects -------------------------------------------------------------
-    {.name = "sharpen", .full = full<fx_apply_sharpen_all>, .partial = partial<applySharpen, 0>},
-    {.name = "pixelize", .full = full<applyPixelize, 4>},
+    {.name = "sharpen", .full = row<at("fx_apply_sharpen_all")>, .partial = row<at("applySharpen")>},
+    {.name = "pixelize", .full = row<at("applyPixelize")>},
 
     // ---- Depth-of-field blur: the preview a slider runs, its parts, the one-shot call ------
-    {.name = "blur-preview", .goal = kBlurPreviewGoal, .full = blur_preview,
-     .partial = blur_preview, .setup = init_blur, .teardown = fx_destroy_blur},
+    {.name = "blur-preview", .goal = kBlurPreviewGoal, .full = row<at("fx_make_blur_preview")>,
+     .partial = row<at("fx_make_blur_preview")>, .setup = init_blur, .teardown = fx_destroy_blur},
     {.name = "blur-init", .full = init_blur, .partial = init_blur, .teardown = fx_destroy_blur,
      .changes = false},
     {.name = "blur-gaussian-working", .goal = kBlurKernelGoal, .peer = Peer::kGaussian,
@@ -228,10 +230,10 @@ constexpr Effect kEffects[] = {
      .partial = blur_composite, .setup = init_blurred, .teardown = fx_destroy_blur},
     {.name = "blur-lens-working", .full = lens_working, .setup = init_blur,
      .teardown = fx_destroy_blur, .items = working_samples},
-    {.name = "blur", .full = partial<applyBlur, 8>, .partial = partial<applyBlur, 8>},
+    {.name = "blur", .full = row<at("applyBlur")>, .partial = row<at("applyBlur")>},
 
     // ---- Tilt-shift ------------------------------------------------------------------------
-    {.name = "tilt-shift-preview", .full = tilt_preview, .setup = tilt_init,
+    {.name = "tilt-shift-preview", .full = row<at("makeTiltShift")>, .setup = tilt_init,
      .teardown = destroyTiltShift},
     {.name = "tilt-shift-init", .full = tilt_init, .teardown = destroyTiltShift,
      .changes = false},
@@ -242,7 +244,7 @@ constexpr Effect kEffects[] = {
      .teardown = fx_destroy_blur, .items = working_samples},
     {.name = "tilt-shift-composite", .peer = Peer::kResize, .full = tilt_composite,
      .setup = init_blurred, .teardown = fx_destroy_blur},
-    {.name = "tilt-shift", .full = tilt_oneshot},
+    {.name = "tilt-shift", .full = row<at("applyTiltShift")>},
 
     // ---- Warps ---------------------------------------------------------------------------------
     {.name = "twirl", .goal = kWarpGoal, .peer = Peer::kRemap,
@@ -258,9 +260,9 @@ constexpr Effect kEffects[] = {
      .full = [](const Frame& f) { mirror(f, MIRROR_KEEP_TOP, MIRROR_VERTICAL); }},
 
     // ---- Brushes: one stroke each ----------------------------------------------------------
-    {.name = "lighten-brush", .full = lighten, .items = brush_area, .in_place = true},
-    {.name = "darken-brush", .full = darken, .items = brush_area, .in_place = true},
-    {.name = "pixelize-brush", .full = pixelize_brush, .items = brush_area, .in_place = true},
+    {.name = "lighten-brush", .full = row<at("rubLighten")>, .items = brush_area, .in_place = true},
+    {.name = "darken-brush", .full = row<at("rubDarken")>, .items = brush_area, .in_place = true},
+    {.name = "pixelize-brush", .full = row<at("rubPixelize")>, .items = brush_area, .in_place = true},
     // Whether the photograph has red enough to change under the eye is up to the photograph.
     {.name = "red-eye-brush", .full = red_eye, .items = eye_area, .in_place = true,
      .changes = false},

@@ -22,7 +22,7 @@ def load(name, path):
 
 
 report = load("report", os.path.join(HERE, "report"))
-png = load("make_crop", os.path.join(os.path.dirname(HERE), "tests", "data", "make_crop.py"))
+png = load("make_crop", os.path.join(os.path.dirname(HERE), "scripts", "make-test-crop"))
 
 
 def bench(name, ms, label="", peak=0.0, px=12e6, aggregate="median", error=None):

@@ -21,9 +21,9 @@ namespace {
 
 // One row of the depth compositing, from its column sums. Within a span only the column
 // fraction wx changes, so the per-pixel work is a few multiply-adds the compiler vectorises.
-PFX_VECTOR_CLONES void composite_row(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
-                                     const ColumnSum* sums, const int32_t* span_start,
-                                     int32_t spans, int32_t xscale) {
+void composite_row_loop(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
+                        const ColumnSum* sums, const int32_t* span_start, int32_t spans,
+                        int32_t xscale) {
   for (int32_t j = 0; j < spans; ++j) {
     const ColumnSum a = sums[j], b = sums[j + 1];
     const int32_t r0 = a.r * 32, dr = b.r - a.r;
@@ -45,6 +45,11 @@ PFX_VECTOR_CLONES void composite_row(const uint32_t* src, const uint8_t* mask, u
       dst[x] = (mask == nullptr || mask[x] != 0) ? out : s;
     }
   }
+}
+
+void composite_row(const uint32_t* src, const uint8_t* mask, uint32_t* dst, const ColumnSum* sums,
+                   const int32_t* span_start, int32_t spans, int32_t xscale) {
+  vector_paths([&] { composite_row_loop(src, mask, dst, sums, span_start, spans, xscale); });
 }
 
 }  // namespace

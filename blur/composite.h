@@ -5,13 +5,7 @@
 
 #include <cstdint>
 
-// Tells GCC that a loop carries no dependence between iterations, so that it vectorises it
-// without a runtime overlap check that would send in-place calls down the scalar path.
-#if defined(__GNUC__) && !defined(__clang__)
-#define PFX_NO_ALIAS_LOOP _Pragma("GCC ivdep")
-#else
-#define PFX_NO_ALIAS_LOOP
-#endif
+#include "frame/dispatch.h"
 
 namespace pfx {
 

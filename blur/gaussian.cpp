@@ -35,10 +35,11 @@ constexpr Window window_for(int32_t level) {
 // other tap in the window stands for the centre sample with weight 9, so the weight is 9..81
 // and the result the sum over the weight. All nine taps are summed in registers, and the loop
 // vectorises across the line (the outputs are __restrict, so they cannot move the inputs).
-PFX_VECTOR_CLONES void blur_line(int32_t from, int32_t n, const Taps& taps, const uint8_t* c0,
-                                 const uint8_t* c1, const uint8_t* c2, uint8_t* __restrict o0,
-                                 uint8_t* __restrict o1, uint8_t* __restrict o2) {
+void blur_line_loop(int32_t from, int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
+                    const uint8_t* c2, uint8_t* __restrict o0, uint8_t* __restrict o1,
+                    uint8_t* __restrict o2) {
   const Taps t = taps;
+  PFX_NO_ALIAS_LOOP
   for (int32_t x = from; x < n; ++x) {
     // Every sum fits 16 bits (channels at most 255 x 55, weights at most 55, counts at most
     // 9), and 16-bit lanes hold twice as many outputs per vector.
@@ -63,16 +64,20 @@ PFX_VECTOR_CLONES void blur_line(int32_t from, int32_t n, const Taps& taps, cons
   }
 }
 
-// A line through the NEON kernel first where the path has one.
-void line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1, const uint8_t* c2,
-          uint8_t* o0, uint8_t* o1, uint8_t* o2, bool clean) {
-  const size_t done = neon_kernels() ? neon::blur_line(n, taps, c0, c1, c2, o0, o1, o2, clean) : 0;
-  blur_line(static_cast<int32_t>(done), n, taps, c0, c1, c2, o0, o1, o2);
+// A line: through the NEON kernel first where the path has one, the rest by the loop's copy of
+// the path in force.
+void blur_line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1, const uint8_t* c2,
+               uint8_t* o0, uint8_t* o1, uint8_t* o2, bool clean) {
+  const int32_t done =
+      neon_kernels() ? static_cast<int32_t>(neon::blur_line(n, taps, c0, c1, c2, o0, o1, o2, clean))
+                     : 0;
+  vector_paths([&] { blur_line_loop(done, n, taps, c0, c1, c2, o0, o1, o2); });
 }
 
 // Splits a row of red, green, blue samples into three channel rows, and joins them back.
-PFX_VECTOR_CLONES void split_row(const uint8_t* rgb, int32_t n, uint8_t* __restrict r,
-                                 uint8_t* __restrict g, uint8_t* __restrict b) {
+void split_row_loop(const uint8_t* rgb, int32_t n, uint8_t* __restrict r, uint8_t* __restrict g,
+                    uint8_t* __restrict b) {
+  PFX_NO_ALIAS_LOOP
   for (int32_t x = 0; x < n; ++x) {
     r[x] = rgb[3 * x];
     g[x] = rgb[3 * x + 1];
@@ -80,13 +85,22 @@ PFX_VECTOR_CLONES void split_row(const uint8_t* rgb, int32_t n, uint8_t* __restr
   }
 }
 
-PFX_VECTOR_CLONES void join_row(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n,
-                                uint8_t* __restrict rgb) {
+void split_row(const uint8_t* rgb, int32_t n, uint8_t* r, uint8_t* g, uint8_t* b) {
+  vector_paths([&] { split_row_loop(rgb, n, r, g, b); });
+}
+
+void join_row_loop(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n,
+                   uint8_t* __restrict rgb) {
+  PFX_NO_ALIAS_LOOP
   for (int32_t x = 0; x < n; ++x) {
     rgb[3 * x] = r[x];
     rgb[3 * x + 1] = g[x];
     rgb[3 * x + 2] = b[x];
   }
+}
+
+void join_row(const uint8_t* r, const uint8_t* g, const uint8_t* b, int32_t n, uint8_t* rgb) {
+  vector_paths([&] { join_row_loop(r, g, b, n, rgb); });
 }
 
 }  // namespace
@@ -150,8 +164,8 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
     const uint8_t* in = src + 3 * row;
     for (size_t x = 0; x < w; ++x) inside[kPad + x] = flags[row + x];
     split_row(in, width, value[0] + kPad, value[1] + kPad, value[2] + kPad);
-    line(width, taps, value[0] + kPad, value[1] + kPad, value[2] + kPad, plane[0] + row,
-         plane[1] + row, plane[2] + row, rows_known && full_row[y]);
+    blur_line(width, taps, value[0] + kPad, value[1] + kPad, value[2] + kPad, plane[0] + row,
+              plane[1] + row, plane[2] + row, rows_known && full_row[y]);
   }
 
   // Vertical pass, from the planes into dst, a row of outputs at a time. Rows beyond the edge
@@ -171,8 +185,8 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
       if (used && clean) clean = full_row[y + o];
     }
     const size_t row = static_cast<size_t>(y) * w;
-    line(width, taps, plane[0] + row, plane[1] + row, plane[2] + row, value[0], value[1], value[2],
-         clean);
+    blur_line(width, taps, plane[0] + row, plane[1] + row, plane[2] + row, value[0], value[1],
+              value[2], clean);
     join_row(value[0], value[1], value[2], width, dst + 3 * row);
   }
   fx_free(block);

@@ -30,16 +30,21 @@ constexpr uint32_t sharpen_pixel(uint32_t left, uint32_t p, uint32_t right) {
 }
 
 // The middle of a row into another buffer: every neighbour is read straight from the source, so
-// the loop vectorises (cloned for the widest vectors on x86-64).
+// the loop vectorises (on x86-64 in the copy of the path in force).
 template <bool Masked>
-PFX_VECTOR_CLONES static void sharpen_apart(const uint32_t* __restrict in,
-                                            const uint8_t* __restrict mask,
-                                            uint32_t* __restrict out, size_t from, size_t w) {
+void sharpen_apart_loop(const uint32_t* __restrict in, const uint8_t* __restrict mask,
+                        uint32_t* __restrict out, size_t from, size_t w) {
+  PFX_NO_ALIAS_LOOP
   for (size_t x = from; x + 1 < w; ++x) {
     const uint32_t p = in[x];
     const uint32_t s = sharpen_pixel(in[x - 1], p, in[x + 1]);
     out[x] = !Masked || mask[x] == 1 ? s : p;
   }
+}
+
+template <bool Masked>
+void sharpen_apart(const uint32_t* in, const uint8_t* mask, uint32_t* out, size_t from, size_t w) {
+  vector_paths([&] { sharpen_apart_loop<Masked>(in, mask, out, from, w); });
 }
 
 // Sharpens the pixels whose mask byte is 1 (every pixel without a mask) and keeps the others.

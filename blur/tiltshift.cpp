@@ -29,9 +29,8 @@ namespace {
 // One row of the upscaled blur mixed with the source: weight w (0..256) of the source, the rest
 // of the blur. Spans and column sums as for the depth compositing, with no depth; the bilinear
 // value is at most 255 and the mix at most 255, so neither needs clamping.
-PFX_VECTOR_CLONES void restore_row(const uint32_t* src, uint32_t* dst, const ColumnSum* sums,
-                                   const int32_t* span_start, int32_t spans, int32_t xscale,
-                                   int32_t w) {
+void restore_row_loop(const uint32_t* src, uint32_t* dst, const ColumnSum* sums,
+                      const int32_t* span_start, int32_t spans, int32_t xscale, int32_t w) {
   const int32_t blur_w = 256 - w;
   for (int32_t j = 0; j < spans; ++j) {
     const ColumnSum a = sums[j], b = sums[j + 1];
@@ -54,6 +53,11 @@ PFX_VECTOR_CLONES void restore_row(const uint32_t* src, uint32_t* dst, const Col
                (static_cast<uint32_t>(g) << 8) | static_cast<uint32_t>(bl);
     }
   }
+}
+
+void restore_row(const uint32_t* src, uint32_t* dst, const ColumnSum* sums,
+                 const int32_t* span_start, int32_t spans, int32_t xscale, int32_t w) {
+  vector_paths([&] { restore_row_loop(src, dst, sums, span_start, spans, xscale, w); });
 }
 
 // Blurred working image, scaled up and mixed with the source by each row's sharpness weight.

@@ -200,6 +200,7 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "brush: lightens a disc, most at its centre; the disc becomes opaque",
      .selects = Selects::kKeep,
+     .writes = Writes::kSome,
      .params = {column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
                 integer("strength", 0, 255, 64, "how much the centre's channels rise"),
@@ -213,6 +214,7 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "brush: darkens a disc, most at its centre; the disc becomes opaque",
      .selects = Selects::kKeep,
+     .writes = Writes::kSome,
      .params = {column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
                 integer("strength", 0, 255, 64, "how much the centre's channels fall"),
@@ -302,6 +304,7 @@ constexpr Effect kEffects[] = {
      .family = "retouch",
      .summary = "brush: the same mosaic inside a disc, on the grid of the whole picture",
      .selects = Selects::kKeep,
+     .writes = Writes::kSome,
      .params = {integer("shift", 0, 31, 4, "blocks of 2^shift pixels a side; 0 changes nothing"),
                 column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
@@ -315,6 +318,7 @@ constexpr Effect kEffects[] = {
      .family = "retouch",
      .summary = "takes the red out of strongly red pixels inside a square",
      .selects = Selects::kKeep,
+     .writes = Writes::kSome,
      .params = {column("cx", 500, "the square's centre column"),
                 row("cy", 500, "the square's centre row"),
                 length("radius", 0, 250, "half the square's side in pixels")},
@@ -388,6 +392,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "faded warm film: tone curves, brightness and contrast, then a vignette",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = full_and_partial<applyVintage, applyVintagePartial>,
      .gallery = ""},
@@ -409,6 +414,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "a warm tone with a quarter of a paper texture mixed in",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = old_photo_texture,
      .gallery = ""},
@@ -437,6 +443,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: faded, slightly bright and desaturated",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = full_and_partial<applyRetro, applyRetroPartial>,
      .gallery = ""},
@@ -444,6 +451,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: warm and golden, blue held back",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = full_and_partial<applySunshine, applySunshinePartial>,
      .gallery = ""},
@@ -452,6 +460,7 @@ constexpr Effect kEffects[] = {
      .summary = "preset: faded and auto-adjusted, soft and dim; takes auto adjust's parameters",
      .selects = Selects::kMask,
      .state = State::kAutoAdjust,
+     .writes = Writes::kAllWhenWhole,
      .params = {kThreshold, kCutOff, kWeight1, kWeight2},
      .run = [](const Call& c) {
        const AutoAdjustSettings settings(c, 0);
@@ -462,6 +471,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: cool and blue, a little more contrast",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = full_and_partial<applyBluewash, applyBluewashPartial>,
      .gallery = ""},
@@ -469,6 +479,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: faded, bright and warm",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = full_and_partial<applyNostalgia, applyNostalgiaPartial>,
      .gallery = ""},
@@ -476,6 +487,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: faded and strongly yellow, with lifted contrast",
      .selects = Selects::kMask,
+     .writes = Writes::kAllWhenWhole,
      .params = {},
      .run = full_and_partial<applyYellowglow, applyYellowglowPartial>,
      .gallery = ""},
@@ -617,6 +629,26 @@ const Effect* find_effect(std::string_view name) {
   return nullptr;
 }
 
+std::string preview_step(const Effect& effect) {
+  const size_t n = effect.param_count();
+  const Effect* p = find_effect(std::string(effect.name) + "-preview");
+  if (p != nullptr && p->param_count() == n) {
+    bool same = true;
+    for (size_t k = 0; k < n; ++k)
+      same = same && std::strcmp(effect.params[k].name, p->params[k].name) == 0;
+    if (same) return p->name;
+  }
+  for (size_t k = 0; k < n; ++k) {
+    const Param& q = effect.params[k];
+    if (std::strcmp(q.name, "fast") != 0 || q.kind != Kind::kChoice) continue;
+    for (int32_t i = 0; i < q.choice_count; ++i) {
+      if (std::strcmp(q.choices[i].label, "on") == 0)
+        return std::string(effect.name) + " --fast on";
+    }
+  }
+  return {};
+}
+
 std::string result_code(int32_t code) {
   switch (code) {
     case PHOTOFX_SUCCESS:
@@ -634,10 +666,12 @@ std::string result_code(int32_t code) {
 
 namespace detail {
 
+#if defined(__linux__) && !defined(__EMSCRIPTEN__)
 // Below this a buffer takes ordinary pages; above it, 2 MB pages where Linux has them on
 // request (transparent huge pages in "madvise" mode, the common default).
 constexpr size_t kHugePage = size_t{2} << 20;
 constexpr size_t kHugeFrom = 4 * kHugePage;
+#endif
 
 void* allocate_pixels(size_t bytes) {
   void* p = nullptr;
@@ -702,9 +736,14 @@ std::string run_effect(const Effect& effect, const Values& values, const uint32_
       !err.empty()) {
     return err;
   }
-  // Same-size effects start from the source in dst (the brushes edit it there).
-  if (effect.size == nullptr && src != dst) std::memcpy(dst, src, n * sizeof(uint32_t));
   const bool partial = selection != nullptr && effect.selects == Selects::kMask;
+  // Same-size effects that leave pixels alone start from the source in dst (the brushes edit it
+  // there).
+  const bool leaves_pixels =
+      effect.writes == Writes::kSome || (partial && effect.writes == Writes::kAllWhenWhole);
+  if (effect.size == nullptr && src != dst && leaves_pixels) {
+    std::memcpy(dst, src, n * sizeof(uint32_t));
+  }
   const Bounds whole_image{0, width - 1, 0, height - 1};
   const Call call{.src = src,
                   .dst = dst,

@@ -55,6 +55,15 @@ enum class State : uint8_t {
   kAutoAdjust,     // auto adjust's four parameters, read by auto adjust and downlight
 };
 
+// Which pixels of `dst` a run function writes. Whatever it leaves must hold the source already,
+// which run_effect sees to by copying it there first; a run function that writes every pixel is
+// spared that copy, which costs about as much as a simple effect.
+enum class Writes : uint8_t {
+  kAll,           // every pixel, on the whole image and under a selection
+  kAllWhenWhole,  // every pixel of the whole image; under a selection only the selected ones
+  kSome,          // only the pixels it edits (the brushes)
+};
+
 // What an integer parameter's range is measured against. Positions and lengths depend on the
 // image: their range ends at the image's width, height or longer side, and their default is a
 // fraction of it in thousandths (500 is the middle).
@@ -87,9 +96,10 @@ constexpr size_t kMaxParams = 6;
 // Parameter values in the entry's order: numbers as they are, choices as their library value.
 using Values = std::array<double, kMaxParams>;
 
-// Everything a run function needs. Same-size effects find the source already in `dst` (a copy,
-// or the very buffer when they run in place), so the brushes edit `dst`; effects that change the
-// size get a separate `dst` of out_width x out_height.
+// Everything a run function needs. Same-size effects whose entry says they do not write every
+// pixel (Writes) find the source already in `dst` (a copy, or the very buffer when they run in
+// place), so the brushes edit `dst`; effects that change the size get a separate `dst` of
+// out_width x out_height.
 struct Call {
   const uint32_t* src;  // width x height; equal to dst when the effect runs in place
   uint32_t* dst;
@@ -127,6 +137,7 @@ struct Effect {
   // The run function gives the same pixels with src == dst as with two buffers (checked by the
   // tool's tests for every entry that says so). Hosts then need only one image in memory.
   bool in_place = true;
+  Writes writes = Writes::kAll;
   std::array<Param, kMaxParams> params;
   Run run;
   Size size = nullptr;  // null: the output has the input's size
@@ -144,6 +155,12 @@ struct Effect {
 // The catalogue, in the order lists and galleries show it.
 std::span<const Effect> effects();
 const Effect* find_effect(std::string_view name);
+
+// What an editor's slider runs while it moves, as the start of a step in the chain syntax: the
+// entry NAME-preview when the table has one with the same parameters (the blur and tilt-shift
+// workspaces, the vignette, vintage and pop-art previews), or the effect with "--fast on" (the
+// warps). Empty: the effect itself serves.
+std::string preview_step(const Effect& effect);
 
 // ---- Running an effect on caller buffers ---------------------------------------------------
 

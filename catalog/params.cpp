@@ -5,6 +5,7 @@
 #include <charconv>
 #include <cmath>
 #include <cstdio>
+#include <cstdlib>
 #include <numeric>
 #include <string>
 
@@ -31,9 +32,13 @@ bool parse_integer(std::string_view text, double& out) {
 bool parse_real(std::string_view text, double& out) {
   if (!text.empty() && text.front() == '+') text.remove_prefix(1);
   if (text.empty() || text.front() == '+') return false;
-  double v = 0;
-  const auto [end, ec] = std::from_chars(text.data(), text.data() + text.size(), v);
-  if (ec != std::errc() || end != text.data() + text.size() || !std::isfinite(v)) return false;
+  // Plain decimal notation only: no white space, hex, "inf" or "nan". strtod converts, since
+  // not every C++ library reads a double with from_chars (emscripten's does not).
+  if (text.find_first_not_of("0123456789.eE+-") != std::string_view::npos) return false;
+  const std::string copy(text);
+  char* end = nullptr;
+  const double v = std::strtod(copy.c_str(), &end);
+  if (end != copy.c_str() + copy.size() || !std::isfinite(v)) return false;
   out = v;
   return true;
 }

@@ -56,29 +56,38 @@ inline void copy_image(const uint32_t* src, uint32_t* dst, int64_t n) {
 }
 
 // The loops under the frames. They are written as plain loops over one run of pixels so that a
-// rule of plain integer arithmetic vectorises, and cloned for the widest vectors the CPU has.
-// They are static: GCC gives the load-time resolver of a cloned template with external linkage
-// default visibility, which would export it from the library.
+// rule of plain integer arithmetic vectorises, and compiled for the widest vectors of the path
+// in force (frame/dispatch.h).
 //
 // dst[i] = rule(src[i]) for i < n. Each output reads only its own source pixel, so src and dst
 // may be the same buffer.
 template <class Rule>
-PFX_WIDE_VECTOR_CLONES static void map_pixels(const uint32_t* src, uint32_t* dst, size_t n,
-                                              const Rule& rule) {
+inline void map_pixels_loop(const uint32_t* src, uint32_t* dst, size_t n, const Rule& rule) {
   for (size_t i = 0; i < n; ++i) dst[i] = rule(src[i]);
+}
+
+template <class Rule>
+inline void map_pixels(const uint32_t* src, uint32_t* dst, size_t n, const Rule& rule) {
+  wide_vector_paths([&] { map_pixels_loop(src, dst, n, rule); });
 }
 
 // dst[i] = rule(src[i]) where mask[i] is exactly 1, src[i] elsewhere, for i < n. The rule is
 // worked out for every pixel and the mask picks, which is cheaper than a branch per pixel when
 // the rule vectorises.
 template <class Rule>
-PFX_WIDE_VECTOR_CLONES static void map_selected_pixels(const uint32_t* src, const uint8_t* mask,
-                                                       uint32_t* dst, size_t n, const Rule& rule) {
+inline void map_selected_loop(const uint32_t* src, const uint8_t* mask, uint32_t* dst, size_t n,
+                              const Rule& rule) {
   for (size_t i = 0; i < n; ++i) {
     const uint32_t p = src[i];
     const uint32_t q = rule(p);
     dst[i] = mask[i] == 1 ? q : p;
   }
+}
+
+template <class Rule>
+inline void map_selected_pixels(const uint32_t* src, const uint8_t* mask, uint32_t* dst, size_t n,
+                                const Rule& rule) {
+  wide_vector_paths([&] { map_selected_loop(src, mask, dst, n, rule); });
 }
 
 // Copies pixels [begin, end) unless source and destination are the same buffer.

@@ -8,6 +8,7 @@
 
 #include <cstdint>
 
+#include "frame/divide.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "frame/table.h"
@@ -26,15 +27,13 @@ constexpr uint8_t sepia_blue_entry(int32_t v) { return static_cast<uint8_t>(sepi
 // slider ends the grey simply pins at 0 or 255), and then held to 0 .. 255 << 16 so that the
 // product fits an unsigned 32-bit word: a gain of 0 or less makes every grey 0 and one of
 // 255 << 16 or more makes every non-zero mean 255 already. The mean is sum / 3 by a
-// multiplication, which vectorises: (sum * 683) >> 11 exceeds sum / 3 by sum / 6144, less than a
-// third for every sum up to 765, so the floor is the same.
+// multiplication (frame/divide.h), which vectorises.
 class GreyscaleRule {
  public:
   explicit constexpr GreyscaleRule(int32_t level) : gain_(held_gain(level)) {}
 
   constexpr uint32_t operator()(uint32_t p) const {
-    const uint32_t mean =
-        (static_cast<uint32_t>(red_of(p) + green_of(p) + blue_of(p)) * 683u) >> 11;
+    const uint32_t mean = third(static_cast<uint32_t>(red_of(p) + green_of(p) + blue_of(p)));
     const uint32_t v = (mean * gain_) >> 16;
     return alpha_bits(p) | (v > 255u ? 255u : v) * 0x010101u;
   }

@@ -12,6 +12,7 @@
 #include <cstdint>
 
 #include "frame/dispatch.h"
+#include "frame/divide.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
 #include "frame/pixel.h"
@@ -52,11 +53,6 @@ struct Rows {
   return pack(p, hsv_to_rgb(hsv.h, hsv.s, curve[hsv.v]));
 }
 
-// x / 36 for 0 <= x < 2^14 (a weighted sum is at most 36 * 255): with M = ceil(2^19 / 36) =
-// 14564, M * 36 - 2^19 = 16 is below 2^(19 - 14), so x * M / 2^19 exceeds x / 36 by less than
-// 1 / 36 and never reaches the next integer. A multiplication vectorises; a division does not.
-constexpr int32_t div36(int32_t x) { return (x * 14564) >> 19; }
-
 // A pixel with all eight neighbours: the weighted average of its 3 x 3 neighbourhood, glowed.
 [[gnu::always_inline]] inline uint32_t blurred_glow(const Rows& rows, size_t x,
                                                     const int32_t* curve) {
@@ -79,9 +75,9 @@ constexpr int32_t div36(int32_t x) { return (x * 14564) >> 19; }
 // overlaps the rows read (when dst is the source they are saved copies) nor the curve, which
 // lets the curve's reads become vector gathers.
 template <bool kMasked>
-PFX_WIDE_VECTOR_CLONES static void glow_interior(Rows rows, uint32_t* __restrict out,
-                                                 const uint8_t* mask, size_t begin, size_t end,
-                                                 const int32_t* __restrict curve) {
+void glow_interior_loop(Rows rows, uint32_t* __restrict out, const uint8_t* mask, size_t begin,
+                        size_t end, const int32_t* __restrict curve) {
+  PFX_NO_ALIAS_LOOP
   for (size_t x = begin; x < end; ++x) {
     const uint32_t q = blurred_glow(rows, x, curve);
     if constexpr (kMasked) {
@@ -90,6 +86,12 @@ PFX_WIDE_VECTOR_CLONES static void glow_interior(Rows rows, uint32_t* __restrict
       out[x] = q;
     }
   }
+}
+
+template <bool kMasked>
+void glow_interior(Rows rows, uint32_t* out, const uint8_t* mask, size_t begin, size_t end,
+                   const int32_t* curve) {
+  wide_vector_paths([&] { glow_interior_loop<kMasked>(rows, out, mask, begin, end, curve); });
 }
 
 // Source rows as they were before the call. With separate buffers they are read from src

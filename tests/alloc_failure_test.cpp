@@ -1,65 +1,31 @@
-// Every exported function that allocates, run with each of its allocations failing in turn.
+// Every catalogue row that allocates, run with each of its allocations failing in turn, into a
+// second buffer and in place.
 //
 // A failed allocation must never be written through (the sanitizer build would stop), must leak
 // nothing (the sanitizer build runs LeakSanitizer at exit), must return PHOTOFX_OUT_OF_MEMORY
-// where the function returns a code, must leave the destination and the module's globals as
-// they were (or, for an init, no workspace at all), must never write the caller's inputs, and
-// must not stop the next call, with memory to spare, from working. A new allocating function
-// needs one line in kCases.
+// where the function returns a code (auto adjust, which divides instead, PHOTOFX_SUCCESS), must
+// leave the destination as it was (or, for the rows that degrade, make what they make with
+// memory), must leave the workspace as it was (an init: no workspace at all), must never write
+// the caller's inputs, and must not stop the next call, with memory to spare, from working.
 #include <gtest/gtest.h>
 
-#include <cctype>
-#include <cstdint>
-#include <ostream>
 #include <string>
-#include <type_traits>
-#include <vector>
 
 #include "frame/alloc_hook.h"
-#include "frame/frame.h"
-#include "photofx.h"
-#include "support/calls.h"
-#include "support/images.h"
+#include "support/catalog.h"
 
 namespace {
 
-using pfx::test::code_of;
-using pfx::test::kNoCode;
-using pfx::test::Mask;
-using pfx::test::Pixels;
-using Bytes = std::vector<uint8_t>;
+namespace cat = pfx::catalog;
+using cat::Shape;
+using pfx::test::Buffers;
 
-constexpr uint32_t kUntouched = 0xA5A5A5A5u;
-constexpr uint8_t kUntouchedByte = 0x5A;
+// 512 x 300 for the blur, which then works at half size, and auto adjust, which then takes its
+// gain table (from about 131,000 pixels up); 23 x 17 for the rest.
+bool large(const cat::Export& e) {
+  return pfx::test::works_reduced(e) || e.has(cat::kAutoParameters);
+}
 
-// The arguments of one call: a photograph with its mask and a destination, working images and a
-// depth map of the same width and height for the blur building blocks, a texture, and region
-// bounds that select masked mode (`whole` selects the whole image instead).
-struct Buffers {
-  int32_t width, height;
-  Pixels src, dst, texture;
-  Mask mask;
-  Bytes work, work_out, depth;
-  pfx::Rect bounds;
-
-  Buffers(int32_t w, int32_t h, bool whole)
-      : width(w),
-        height(h),
-        src(pfx::test::random_image(w, h, 71)),
-        dst(src.size(), kUntouched),
-        texture(pfx::test::random_image(w, h, 72)),
-        mask(pfx::test::random_mask(w, h, 73)),
-        work(src.size() * 3),
-        work_out(src.size() * 3, kUntouchedByte),
-        depth(src.size()),
-        bounds(whole ? pfx::Rect{1, 0, 0, 0} : pfx::Rect{1, w - 2, 1, h - 2}) {
-    pfx::test::Rng rng(74);
-    for (uint8_t& b : work) b = static_cast<uint8_t>(rng.word());
-    for (uint8_t& b : depth) b = static_cast<uint8_t>(rng.word() & 1);
-  }
-};
-
-// The module state an allocating call may touch.
 struct Globals {
   uint8_t *ssrc, *sblur, *tempd;
   int32_t wd, ht, all_flag, ratio;
@@ -69,6 +35,7 @@ struct Globals {
   bool operator==(const Globals&) const = default;
 };
 
+<<<<<<< HEAD
 // Adapters from the common argument shapes to a call on Buffers.
 template <auto Fn>
 int32_t full(Buffers& b) {
@@ -238,122 +205,116 @@ const Case kCases[] = {
 // Every case starts from the module as a host would have it mid-session: a blur workspace of
 // another photograph exists, which a one-shot call must leave alone and an init must release.
 void start(const Case& c, Buffers& b) {
+=======
+// The module as a host has it mid-session: a workspace of another photograph (a blur workspace,
+// or for the tilt-shift previews a tilt-shift one), which a one-shot call must leave alone and an
+// init must release.
+void start(const cat::Export& e, Buffers& b) {
+>>>>>>> main
   pfx::arm_allocation_failure(0);
   fx_destroy_blur();
-  const Pixels other = pfx::test::random_image(9, 7, 75);
-  fx_Init_blur(other.data(), nullptr, 9, 7, 1, 0, 0, 0);
-  if (c.setup != nullptr) c.setup(b);
+  if (e.shape == Shape::kTilt && e.has(cat::kWorkspace)) {
+    fx_init_tiltshift(b.src.data(), b.width, b.height);
+  } else if (e.shape == Shape::kBlurPreview) {
+    fx_Init_blur(b.src.data(), b.mask.data(), b.width, b.height, b.bounds.left, b.bounds.right,
+                 b.bounds.top, b.bounds.bottom);
+  } else {
+    const pfx::test::Pixels other = pfx::test::random_image(9, 7, 75);
+    fx_Init_blur(other.data(), nullptr, 9, 7, 1, 0, 0, 0);
+  }
+}
+
+bool is_init(const cat::Export& e) {
+  return e.shape == Shape::kBlurInit || e.shape == Shape::kTiltInit;
 }
 
 struct Outcome {
-  int32_t code;
-  Pixels dst;
-  Bytes work_out;
+  int64_t code, requests;
+  Buffers b;
 };
 
-// The call, unarmed, and what the next observation shows.
-Outcome run_unarmed(const Case& c, Buffers& b) {
-  b.dst.assign(b.dst.size(), kUntouched);
-  b.work_out.assign(b.work_out.size(), kUntouchedByte);
-  const int32_t code = c.call(b);
-  if (c.observe != nullptr) c.observe(b);
-  return {code, b.dst, b.work_out};
-}
-
-class AllocationFailure : public ::testing::TestWithParam<Case> {
- protected:
-  void TearDown() override {
-    pfx::arm_allocation_failure(0);
-    fx_destroy_blur();
-    all = 0;
-  }
-};
-
-TEST_P(AllocationFailure, WritesNothingLeaksNothingAndTheNextCallWorks) {
-  const Case& c = GetParam();
-  Buffers fresh(c.width, c.height, c.whole);
-
-  // The unarmed call: how many allocations it makes, and what it writes.
-  Buffers ref = fresh;
-  start(c, ref);
+// The row's typical call, the nth allocation failing (0: none); `before` gets the module state
+// the call starts from.
+Outcome call(const cat::Export& e, const Buffers& fresh, bool in_place, int64_t fail_at,
+             Globals* before = nullptr) {
+  Outcome o{0, 0, fresh};
+  start(e, o.b);
+  if (before != nullptr) *before = Globals::now();
+  if (in_place) o.b.dst = o.b.src;
+  const cat::Args a = o.b.args(e, pfx::test::typical(e), in_place);
+  pfx::arm_allocation_failure(fail_at);
+  o.code = e.call(a);
+  o.requests = pfx::allocation_requests();
   pfx::arm_allocation_failure(0);
-  const int32_t ok_code = c.call(ref);
-  const int64_t allocations = pfx::allocation_requests();
-  if (c.observe != nullptr) c.observe(ref);
-  ASSERT_GE(allocations, 1) << "allocates nothing at this size";
-  if (c.out_of_memory != kNoCode) {
-    EXPECT_EQ(ok_code, PHOTOFX_SUCCESS);
-  }
-  ASSERT_TRUE(ref.dst != fresh.dst || ref.work_out != fresh.work_out) << "writes nothing";
+  return o;
+}
 
-  for (int64_t n = 1; n <= allocations; ++n) {
-    SCOPED_TRACE("allocation " + std::to_string(n) + " of " + std::to_string(allocations));
-    Buffers b = fresh;
-    start(c, b);
-    const Globals before = Globals::now();
-    pfx::arm_allocation_failure(n);
-    const int32_t code = c.call(b);
-    pfx::arm_allocation_failure(0);
-
-    EXPECT_EQ(code, c.out_of_memory);
-    EXPECT_EQ(b.src, fresh.src);
-    EXPECT_EQ(b.mask, fresh.mask);
-    EXPECT_EQ(b.texture, fresh.texture);
-    EXPECT_EQ(b.work, fresh.work);
-    EXPECT_EQ(b.depth, fresh.depth);
-    if (c.init) {
-      EXPECT_TRUE(g_ssrc == nullptr && g_sblur == nullptr && g_tempd == nullptr);
-      c.observe(b);  // a preview without a workspace writes nothing
-    } else {
-      EXPECT_TRUE(Globals::now() == before);
-    }
-    if (c.degrades_from != 0 && n >= c.degrades_from) {
-      if (c.degraded != nullptr) {
-        Buffers expected = fresh;
-        c.degraded(expected);
-        EXPECT_EQ(b.dst, expected.dst);
-      } else {
-        EXPECT_NE(b.dst, fresh.dst);  // the chain went on
+TEST(AllocationFailure, WritesNothingLeaksNothingAndTheNextCallWorks) {
+  for (const cat::Export& e : cat::kExports) {
+    if (!pfx::test::is_image_call(e.shape)) continue;
+    bool allocates = false;
+    for (bool in_place : {false, true}) {
+      if (in_place && e.shape != Shape::kFull && e.shape != Shape::kPartial) continue;
+      SCOPED_TRACE(std::string(e.name) + (in_place ? " in place" : ""));
+      const Buffers fresh(large(e) ? 512 : 23, large(e) ? 300 : 17, 71,
+                          e.shape == Shape::kPartial && in_place);
+      const Outcome ref = call(e, fresh, in_place, 0);
+      const int64_t allocations = ref.requests;
+      allocates = allocates || allocations > 0;
+      for (int64_t n = 1; n <= allocations; ++n) {
+        SCOPED_TRACE("allocation " + std::to_string(n) + " of " + std::to_string(allocations));
+        Globals before{};
+        const Outcome o = call(e, fresh, in_place, n, &before);
+        EXPECT_EQ(o.b.mask, fresh.mask);
+        EXPECT_EQ(o.b.texture, fresh.texture);
+        EXPECT_EQ(o.b.work, fresh.work);
+        if (!in_place) {
+          EXPECT_EQ(o.b.src, fresh.src);
+        }
+        if (is_init(e)) {
+          EXPECT_TRUE(g_ssrc == nullptr && g_sblur == nullptr && g_tempd == nullptr);
+        } else {
+          EXPECT_TRUE(Globals::now() == before);
+        }
+        const bool wrote = o.b.dst != (in_place ? fresh.src : fresh.dst);
+        if (e.has(cat::kDegradesWithout) && wrote) {
+          EXPECT_EQ(o.b.dst, ref.b.dst);
+          EXPECT_TRUE(o.code == cat::kNoCode || o.code == PHOTOFX_SUCCESS);
+        } else {
+          EXPECT_FALSE(wrote);
+          EXPECT_EQ(o.b.work_out, fresh.work_out);
+          EXPECT_TRUE(o.code == cat::kNoCode || o.code == PHOTOFX_OUT_OF_MEMORY ||
+                      (e.has(cat::kDegradesWithout) && o.code == PHOTOFX_SUCCESS));
+        }
+        // With memory to spare the same call works again.
+        const Outcome next = call(e, fresh, in_place, 0);
+        EXPECT_EQ(next.code, ref.code);
+        EXPECT_EQ(next.b.dst, ref.b.dst);
+        EXPECT_EQ(next.b.work_out, ref.b.work_out);
       }
-    } else {
-      EXPECT_EQ(b.dst, fresh.dst);
-      EXPECT_EQ(b.work_out, fresh.work_out);
     }
-
-    // With memory to spare the same call works again, from the state the failure left.
-    const Outcome next = run_unarmed(c, b);
-    EXPECT_EQ(next.code, ok_code);
-    EXPECT_EQ(next.dst, ref.dst);
-    EXPECT_EQ(next.work_out, ref.work_out);
+    EXPECT_EQ(allocates, e.has(cat::kAllocates)) << e.name << " allocates";
   }
+  pfx::arm_allocation_failure(0);
+  fx_destroy_blur();
 }
 
-std::string case_name(const ::testing::TestParamInfo<Case>& info) {
-  std::string name = info.param.name;
-  for (char& ch : name) {
-    if (std::isalnum(static_cast<unsigned char>(ch)) == 0) ch = '_';
-  }
-  return name;
-}
-
-INSTANTIATE_TEST_SUITE_P(EveryAllocatingFunction, AllocationFailure, ::testing::ValuesIn(kCases),
-                         case_name);
-
-// The wrappers themselves: a refused request is null, and a refused reallocation keeps the old
-// block, which the caller still owns and frees.
+// The wrappers themselves: a product beyond 32 bits and a refused request are null, and a
+// refused reallocation keeps the old block, which the caller still owns and frees.
 TEST(AllocationWrappers, RefusedRequestsGiveNullAndKeepTheOldBlock) {
-  for (int64_t n : {1, 2, 3}) {
+  for (const auto alloc : {fx_malloc, fx_calloc}) {
+    EXPECT_EQ(alloc(0x10000u, 0x10000u), nullptr);  // exactly 2^32 bytes
+    EXPECT_EQ(alloc(0x80000000u, 2u), nullptr);
+  }
+  for (int64_t n : {1, 2}) {
     pfx::arm_allocation_failure(n);
     void* a = fx_malloc(4, 4);
     void* b = fx_calloc(4, 4);
-    auto* c = static_cast<uint8_t*>(fx_calloc(8, 1));
     pfx::arm_allocation_failure(0);
     EXPECT_EQ(a == nullptr, n == 1);
     EXPECT_EQ(b == nullptr, n == 2);
-    EXPECT_EQ(c == nullptr, n == 3);
     fx_free(a);
     fx_free(b);
-    fx_free(c);
   }
   auto* block = static_cast<uint8_t*>(fx_calloc(8, 1));
   ASSERT_NE(block, nullptr);

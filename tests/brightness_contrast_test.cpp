@@ -13,31 +13,11 @@ namespace {
 
 using pfx::test::Pixels;
 
-uint32_t brightness(uint32_t p, int32_t level) {
-  uint32_t out = 0;
-  fx_control_brightness_all(&p, &out, 1, 1, level);
-  return out;
-}
-
 // Contrast of a grey pixel, reduced to the one channel value.
 int32_t contrast(int32_t c, int32_t level) {
   uint32_t p = 0xFF000000u | static_cast<uint32_t>(c * 0x010101), out = 0;
   fx_control_contrast_all(&p, &out, 1, 1, level);
   return static_cast<int32_t>(out & 0xFF);
-}
-
-TEST(Brightness, MovesLumaTenPerStepAndLosesAStepOnSaturatedColours) {
-  const struct {
-    uint32_t in;
-    int32_t level;
-    uint32_t out;
-  } kCases[] = {
-      {0xFF808080u, 10, 0xFF808080u}, {0xFF808080u, 20, 0xFFE4E4E4u},
-      {0xFF808080u, 0, 0xFF1C1C1Cu},  {0x80FFFFFFu, 10, 0x80FFFFFFu},
-      {0xFFFF0000u, 10, 0xFFFE0000u}, {0xFF0000FFu, 10, 0xFF0000FDu},
-      {0xFF00FF00u, 10, 0xFF00FF00u}, {0x00000000u, 10, 0x00000000u},
-  };
-  for (const auto& c : kCases) EXPECT_EQ(brightness(c.in, c.level), c.out) << std::hex << c.in;
 }
 
 TEST(Brightness, ExtremeLevelsSaturateWithoutOverflow) {
@@ -58,17 +38,6 @@ TEST(Contrast, StepTableIsTheTenthRoundedAwayFromZero) {
     const int32_t expected = static_cast<int32_t>(c < 128 ? std::floor(exact) : std::ceil(exact));
     EXPECT_EQ(pfx::kContrastStep[c], expected) << c;
   }
-}
-
-TEST(Contrast, WorkedValues) {
-  const struct {
-    int32_t c, level, out;
-  } kCases[] = {
-      {200, 20, 255}, {50, 20, 0},  {128, 20, 128}, {127, 20, 117},  // away from the middle
-      {200, 0, 128},  {50, 0, 128}, {0, 1, 117},    {255, 1, 138},   // toward it
-      {77, 10, 77},                                                  // neutral
-  };
-  for (const auto& c : kCases) EXPECT_EQ(contrast(c.c, c.level), c.out) << c.c << " at " << c.level;
 }
 
 // Low levels draw toward the middle without crossing it; levels far out act like the ends.

@@ -1,5 +1,5 @@
-# Compares the dynamic symbols a shared library defines with the expected names, one per line in
-# the *.txt files of EXPECTED_DIR (blank lines and # comments ignored).
+# Compares the dynamic symbols a shared library defines with the names of the catalogue of
+# exports (CATALOG, catalog/exports.h): every row's name, nothing more or less.
 execute_process(COMMAND ${NM} -D --defined-only ${LIBRARY}
   OUTPUT_VARIABLE nm_out RESULT_VARIABLE nm_rc)
 if(NOT nm_rc EQUAL 0)
@@ -14,23 +14,20 @@ foreach(line IN LISTS nm_lines)
     set(type "${CMAKE_MATCH_1}")
     set(name "${CMAKE_MATCH_2}")
     # Sanitizer builds add ODR indicators and runtime hooks of their own.
-    if(NOT type STREQUAL "A" AND NOT name MATCHES "^__(odr_asan|asan|ubsan|sanitizer)")
+    if(NOT type STREQUAL "A" AND NOT name MATCHES "^__(odr_asan|asan|ubsan|sanitizer|tsan)")
       list(APPEND actual "${name}")
     endif()
   endif()
 endforeach()
 
-file(GLOB lists ${EXPECTED_DIR}/*.txt)
+# The rows of the table: row("name", ...), fn(...), table(...), global(...) and {"name", Shape::.
+file(READ ${CATALOG} text)
+string(REGEX MATCHALL "\n +(row|fn|table|global)\\(\"[A-Za-z0-9_]+\"|\n +{\"[A-Za-z0-9_]+\", Shape::"
+       rows "${text}")
 set(expected "")
-foreach(list_file IN LISTS lists)
-  file(STRINGS ${list_file} names)
-  foreach(name IN LISTS names)
-    string(STRIP "${name}" name)
-    if(name STREQUAL "" OR name MATCHES "^#")
-      continue()
-    endif()
-    list(APPEND expected "${name}")
-  endforeach()
+foreach(row IN LISTS rows)
+  string(REGEX REPLACE "^[^\"]*\"([A-Za-z0-9_]+)\".*$" "\\1" name "${row}")
+  list(APPEND expected "${name}")
 endforeach()
 
 list(SORT actual)
@@ -41,9 +38,11 @@ set(stray ${actual})
 list(REMOVE_ITEM stray ${expected})
 list(LENGTH expected n_expected)
 list(LENGTH actual n_actual)
-if(missing OR stray)
+if(missing OR stray OR n_expected LESS 100)
   string(REPLACE ";" " " missing "${missing}")
   string(REPLACE ";" " " stray "${stray}")
-  message(FATAL_ERROR "export list differs\n  missing: ${missing}\n  stray: ${stray}")
+  message(FATAL_ERROR "exports differ from the catalogue (${n_expected} rows)\n"
+                      "  in the catalogue, not exported: ${missing}\n"
+                      "  exported, not in the catalogue: ${stray}")
 endif()
-message(STATUS "exports match: ${n_actual} symbols")
+message(STATUS "exports match the catalogue: ${n_actual} symbols")

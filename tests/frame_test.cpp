@@ -1,7 +1,5 @@
-// The calling frame: memory wrappers, channel packing and the partial-variant rules, exercised
-// through brightness (the simplest effect that runs in both frames). Missing buffers, empty and
-// unaddressable sizes and the mask never written are in bad_input_test; failed allocations in
-// alloc_failure_test.
+// The partial-variant rules of the calling frame, exercised through brightness (the simplest
+// effect that runs in both frames).
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -10,36 +8,6 @@
 #include "support/images.h"
 
 namespace {
-
-TEST(Memory, WrappersRefuseProductsBeyond32BitsZeroFillAndKeepContents) {
-  for (const auto alloc : {fx_malloc, fx_calloc}) {
-    EXPECT_EQ(alloc(0x10000u, 0x10000u), nullptr);  // exactly 2^32 bytes
-    EXPECT_EQ(alloc(0x80000000u, 2u), nullptr);
-  }
-  auto* p = static_cast<uint32_t*>(fx_calloc(8u, 4u));
-  ASSERT_NE(p, nullptr);
-  for (int i = 0; i < 8; ++i) EXPECT_EQ(p[i], 0u);
-  p[7] = 0x12345678u;
-  p = static_cast<uint32_t*>(fx_realloc(p, 64u));
-  ASSERT_NE(p, nullptr);
-  EXPECT_EQ(p[7], 0x12345678u);
-  uint32_t copy[8] = {};
-  EXPECT_EQ(fx_memcpy(copy, p, 32u), copy);
-  EXPECT_EQ(copy[7], 0x12345678u);
-  fx_memset(p, 0xAB, 64u);
-  EXPECT_EQ(p[15], 0xABABABABu);
-  fx_free(p);
-}
-
-TEST(Packing, PackTakesAlphaFromThePixelAndUnpackSplitsTheChannels) {
-  EXPECT_EQ(fx_pack_rgb888(0x12345678u, 0x1AB, 0xCD, 0xEF), 0x12ABCDEFu);
-  EXPECT_EQ(fx_pack_rgb888(0xFF000000u, -1, 256, 0), 0xFFFF0000u);
-  int32_t r = -1, g = -1, b = -1;
-  fx_unpack_rgb888(static_cast<int32_t>(0xFF102030u), &r, &g, &b);
-  EXPECT_EQ(r, 16);
-  EXPECT_EQ(g, 32);
-  EXPECT_EQ(b, 48);
-}
 
 // Brightness 20 on grey 0x80 gives 0xE4, so edited pixels are easy to tell apart. Only mask
 // byte 1 selects; a valid rectangle edits the selected pixels inside it, clipped to the image; a

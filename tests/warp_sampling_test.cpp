@@ -52,43 +52,4 @@ TEST(Bilinear, WeightsTruncationAndNullPointers) {
   EXPECT_EQ(Bilinear_Fixed(0, 0, &p, &p, &p, &p, nullptr), 0xFF123456u);
 }
 
-TEST(Fatan2, AxesAndDiagonalsOfEveryQuadrant) {
-  const struct {
-    int32_t y, x;
-    uint32_t angle;
-  } cases[] = {
-      // clang-format off
-      {0, 0, 0}, {0, 5, 0}, {5, 0, k90}, {0, -5, k180}, {-5, 0, k270},
-      {1, 1, k45}, {1, -1, k180 - k45}, {-1, -1, k180 + k45}, {-1, 1, k360 - k45},
-      {INT32_MIN, 0, k270}, {0, INT32_MIN, k180}, {1, INT32_MIN, k180},
-      // clang-format on
-  };
-  for (const auto& c : cases) EXPECT_EQ(FATAN2(c.y, c.x), c.angle) << c.y << "," << c.x;
-}
-
-// Every result lies in [0, 360) degrees and within a table step of the true angle, which also
-// checks how each octant folds the table angle; tiny angles below the zero axis and the most
-// negative coordinates must not leave the range.
-TEST(Fatan2, FollowsTheTrueAngleAndStaysBelowAFullTurn) {
-  pfx::test::Rng rng(99);
-  for (int n = 0; n < 20000; ++n) {
-    const int32_t a = rng.between(-20000, 20000), b = rng.between(-20000, 20000);
-    if (a == 0 && b == 0) continue;
-    const uint32_t got = FATAN2(a, b);
-    ASSERT_LT(got, k360);
-    double want = std::atan2(static_cast<double>(a), static_cast<double>(b)) * 180.0 / kPi;
-    if (want < 0) want += 360.0;
-    double diff = std::fabs(got / static_cast<double>(kDeg) - want);
-    diff = std::fmin(diff, 360.0 - diff);
-    // The ratio has 11 fraction bits: one step is at most 1/2048 radian, about 0.028 degree;
-    // the truncated reciprocal adds under 0.003 degree at these lengths.
-    ASSERT_LT(diff, 0.031) << a << "," << b;
-  }
-  EXPECT_EQ(FATAN2(-1, 3000), 0u);
-  EXPECT_EQ(FATAN2(-1, 1000), k360 - static_cast<uint32_t>(ATAN[2]));
-  const uint32_t third_quadrant = FATAN2(INT32_MIN, INT32_MIN);
-  EXPECT_GE(third_quadrant, k180);
-  EXPECT_LT(third_quadrant, k270);
-}
-
 }  // namespace

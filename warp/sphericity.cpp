@@ -8,6 +8,7 @@
 #include <cstdint>
 
 #include "frame/dispatch.h"
+#include "frame/divide.h"
 #include "frame/frame.h"
 #include "photofx.h"
 #include "warp/warp.h"
@@ -107,20 +108,17 @@ struct Sphericity {
 //
 // Bulge: with x = cx + dx the rule's numerator is x 2^18 + cx k = cx den + dx 2^18, so
 // sx = cx + floor(dx 2^18 / den) and rx is the remainder of that floor division. For n = |dx|
-// the quotient comes from R = floor(2^37 / den): floor(n R / 2^19) falls short of
-// n 2^18 / den by less than n / 2^19 < 1 / 64 (as den >= 2^18), so it is the quotient or one
-// less, and one correction step makes it exact. n R < 2^13 * 2^19 fits 32 bits, as does
-// n 2^18. The weight's scale 2^30 / den is R >> 7 (floor(floor(a / b) / c) = floor(a / bc)).
+// the quotient comes from R = floor(2^37 / den) by one multiplication and one correction step
+// (bulge_quotient, frame/divide.h). The weight's scale 2^30 / den is R >> 7
+// (floor(floor(a / b) / c) = floor(a / bc)).
 //
 // Pinch: k < 2^19 and |dx| < 2^13 make k dx a 33-bit product, but only k dx >> 7 is needed
 // (its whole pixels from bit 11 up, its weight below): with k = 128 kh + kl that is
 // kh dx + (kl dx >> 7), exactly, in 32 bits.
 
-// Warped values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
-// row dy below it.
 // The source point of each pixel at column offsets dx0 + step * i (i < n) on the row dy below
-// the centre, handed to point(i, sx, sy, fx, fy). Always inlined, so that the x86 clones of the
-// run vectorise it with the blend.
+// the centre, handed to point(i, sx, sy, fx, fy). Always inlined, so that the x86-64 copies of
+// the run vectorise it with the blend.
 template <class Point>
 __attribute__((always_inline)) inline void sphericity_points(const SphereRun& run, int32_t dy,
                                                              int32_t dx0, int32_t step, int32_t n,
@@ -137,6 +135,7 @@ __attribute__((always_inline)) inline void sphericity_points(const SphereRun& ru
       f = static_cast<uint32_t>(p7 & 2047);
     };
     const int32_t y = cy + dy;
+    PFX_NO_ALIAS_LOOP
     for (int32_t i = 0; i < n; ++i) {
       const int32_t dx = dx0 + step * i;
       const uint32_t d2 = static_cast<uint32_t>(dx * dx) + dy2;
@@ -153,11 +152,8 @@ __attribute__((always_inline)) inline void sphericity_points(const SphereRun& ru
   // Source at centre + floor(d 2^18 / den) along each axis, the remainder giving the weight.
   const auto axis = [](int32_t centre, int32_t d, uint32_t den, uint32_t recip, int32_t& coord,
                        uint32_t& f) {
-    const uint32_t m = static_cast<uint32_t>(d < 0 ? -d : d);
-    uint32_t q = (m * recip) >> 19;
-    uint32_t r = (m << 18) - q * den;
-    q = r >= den ? q + 1 : q;
-    r = r >= den ? r - den : r;
+    const QuotientRemainder qr = bulge_quotient(static_cast<uint32_t>(d < 0 ? -d : d), den, recip);
+    const uint32_t q = qr.q, r = qr.r;
     // For d < 0 the quotient is negated and, when inexact, floored one further. Written as
     // arithmetic on the sign rather than a choice, because d is the same for a whole row on the
     // y axis and the vectoriser cannot choose by a value outside the loop.
@@ -166,6 +162,7 @@ __attribute__((always_inline)) inline void sphericity_points(const SphereRun& ru
     coord = centre + ((static_cast<int32_t>(q) ^ -neg) + neg) - back;
     f = ((recip >> 7) * (back != 0 ? den - r : r)) >> 19;
   };
+  PFX_NO_ALIAS_LOOP
   for (int32_t i = 0; i < n; ++i) {
     const int32_t dx = dx0 + step * i;
     const uint32_t d2 = static_cast<uint32_t>(dx * dx) + dy2;
@@ -179,16 +176,20 @@ __attribute__((always_inline)) inline void sphericity_points(const SphereRun& ru
   }
 }
 
-// The run's pixels sampled: the points as above, each blended at once where the compiler
-// vectorises the loop (x86 clones), or in chunks through the NEON sampler.
-PFX_VECTOR_CLONES void sphericity_run(const SphereRun& run, const uint32_t* __restrict src,
-                                      int32_t dy, int32_t dx0, int32_t step, int32_t n,
-                                      uint32_t* __restrict out) {
+// The run's pixels sampled: the points as above, each blended at once, in a loop the compiler
+// vectorises (on x86-64 in the copy of the path in force).
+void sphericity_run_loop(const SphereRun& run, const uint32_t* __restrict src, int32_t dy,
+                         int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
   const int32_t width = run.width, height = run.height;
   sphericity_points(run, dy, dx0, step, n,
                     [&](int32_t i, int32_t sx, int32_t sy, uint32_t fx, uint32_t fy) {
                       out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
                     });
+}
+
+void sphericity_run(const SphereRun& run, const uint32_t* src, int32_t dy, int32_t dx0,
+                    int32_t step, int32_t n, uint32_t* out) {
+  vector_paths([&] { sphericity_run_loop(run, src, dy, dx0, step, n, out); });
 }
 
 }  // namespace

@@ -196,8 +196,8 @@ struct Twirl {
 
 // The source points of the pixels at column offsets dx0 + step * i (i < n) from the centre on
 // the row dy below it, none of them in the disc where u < 8192, handed to
-// point(i, sx, sy, fx, fy). Always inlined, so that the x86 clones of the run vectorise it with
-// the blend.
+// point(i, sx, sy, fx, fy). Always inlined, so that the x86-64 copies of the run vectorise it
+// with the blend.
 template <class Point>
 __attribute__((always_inline)) inline void twirl_points(const TwirlRun& run, int32_t dy,
                                                         int32_t dx0, int32_t step, int32_t n,
@@ -223,6 +223,7 @@ __attribute__((always_inline)) inline void twirl_points(const TwirlRun& run, int
     coord = neg ? centre - whole - 1 : centre + whole;
     f = neg ? 2048 - part - (exact ? 0 : 1) : part;
   };
+  PFX_NO_ALIAS_LOOP
   for (int32_t i = 0; i < n; ++i) {
     const int32_t dx = dx0 + step * i;
     const uint32_t ay = static_cast<uint32_t>(dx < 0 ? -dx : dx);
@@ -263,14 +264,19 @@ __attribute__((always_inline)) inline void twirl_points(const TwirlRun& run, int
 }
 
 // Twirled values of those pixels: each point blended at once, in a loop the compiler vectorises
-// (x86 clones).
-PFX_VECTOR_CLONES void twirl_run(const TwirlRun& run, const uint32_t* __restrict src, int32_t dy,
-                                 int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
+// (on x86-64 in the copy of the path in force).
+void twirl_run_loop(const TwirlRun& run, const uint32_t* __restrict src, int32_t dy, int32_t dx0,
+                    int32_t step, int32_t n, uint32_t* __restrict out) {
   const int32_t width = run.width, height = run.height;
   twirl_points(run, dy, dx0, step, n,
                [&](int32_t i, int32_t sx, int32_t sy, uint32_t fx, uint32_t fy) {
                  out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
                });
+}
+
+void twirl_run(const TwirlRun& run, const uint32_t* src, int32_t dy, int32_t dx0, int32_t step,
+               int32_t n, uint32_t* out) {
+  vector_paths([&] { twirl_run_loop(run, src, dy, dx0, step, n, out); });
 }
 
 // The same through the NEON sampler, the points in chunks (first by the NEON kernel, the rest

@@ -4,7 +4,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <vector>
 
 namespace pfx::test {
@@ -69,25 +68,6 @@ inline uint64_t hash_pixels(const Pixels& px) { return hash_pixels(px.data(), px
 
 inline uint32_t argb(uint32_t a, uint32_t r, uint32_t g, uint32_t b) {
   return (a << 24) | (r << 16) | (g << 8) | b;
-}
-
-// One row whose pixels name their distance from column c, for the warps: red counts blocks of
-// 256 columns, green runs up and down within them (a triangle wave), so a blend of two
-// neighbouring pixels still names one of the two, and a sampled pixel tells how far out the warp
-// read it.
-inline Pixels distance_code(int32_t w, int32_t c) {
-  Pixels px(static_cast<size_t>(w));
-  for (int32_t x = 0; x < w; ++x) {
-    const int32_t d = std::abs(x - c);
-    const uint32_t block = static_cast<uint32_t>(d >> 8), within = static_cast<uint32_t>(d & 255);
-    px[static_cast<size_t>(x)] = argb(0, block, block % 2 ? 255 - within : within, 0);
-  }
-  return px;
-}
-
-inline int32_t distance_named(uint32_t p) {
-  const int32_t block = static_cast<int32_t>(p >> 16 & 255), g = static_cast<int32_t>(p >> 8 & 255);
-  return block * 256 + (block % 2 ? 255 - g : g);
 }
 
 }  // namespace pfx::test
