@@ -2,13 +2,14 @@
 // exported passes run one after another, and the partial variants made without a scratch image
 // against the full look composited through the mask. Images of awkward sizes whose first pixels
 // run through every channel value, so every folded table entry and every vector block and tail
-// is seen; the ARM builds run this with and without their vector paths.
+// is seen, on every instruction-set path.
 #include <gtest/gtest.h>
 
 #include <cstdint>
 
 #include "photofx.h"
 #include "support/images.h"
+#include "support/paths.h"
 
 namespace {
 
@@ -62,7 +63,9 @@ Pixels vintage_passes(const Pixels& src, Size s) {
   return d;
 }
 
-TEST(FusedLooks, VintageGivesItsTwentyTwoPasses) {
+class FusedLooks : public pfx::test::EveryPath {};
+
+TEST_P(FusedLooks, VintageGivesItsTwentyTwoPasses) {
   uint64_t seed = 500;
   for (const Size s : kSizes) {
     SCOPED_TRACE(testing::Message() << s.w << "x" << s.h);
@@ -81,7 +84,7 @@ using Full = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t);
 using Partial = void (*)(const uint32_t*, const uint8_t*, uint32_t*, int32_t, int32_t, int32_t,
                          int32_t, int32_t, int32_t);
 
-TEST(FusedLooks, PartialVariantsCompositeTheFullLook) {
+TEST_P(FusedLooks, PartialVariantsCompositeTheFullLook) {
   const struct {
     const char* name;
     Full full;
@@ -124,5 +127,7 @@ TEST(FusedLooks, PartialVariantsCompositeTheFullLook) {
     }
   }
 }
+
+INSTANTIATE_TEST_SUITE_P(EveryPath, FusedLooks, pfx::test::every_path(), pfx::test::path_name);
 
 }  // namespace
