@@ -13,11 +13,48 @@
 #include <string_view>
 
 #include "catalog/chain.h"
+#include "catalog/exports.h"
 #include "catalog/texture.h"
 #include "photofx.h"
 
 namespace fxcat {
 namespace {
+
+// ---- What the library's export catalogue already says ---------------------------------------
+
+// A setting that is one of the library's levels takes the level's name, range and neutral value
+// from the export catalogue's row for the function its run calls. The row and the level are
+// looked up when this table is compiled: a name the catalogue lacks does not compile.
+consteval const pfx::catalog::Level& library_level(std::string_view exported,
+                                                   std::string_view name) {
+  for (const pfx::catalog::Level& l :
+       pfx::catalog::kExports[pfx::catalog::index_of(exported)].levels) {
+    // Param keeps a C string: the catalogue's names are literals, so one ends where it does.
+    if (l.name == name && l.name.data()[l.name.size()] == '\0') return l;
+  }
+  throw "the export has no level of that name";
+}
+
+consteval Param level(std::string_view exported, std::string_view name, const char* help) {
+  const pfx::catalog::Level& l = library_level(exported, name);
+  return integer(l.name.data(), l.lo, l.hi, l.neutral, help);
+}
+
+// The same range with the host's own default, where a neutral value would show nothing (a
+// brush of strength 0) or the library has none (a hue).
+consteval Param level(std::string_view exported, std::string_view name, int32_t def,
+                      const char* help) {
+  const pfx::catalog::Level& l = library_level(exported, name);
+  return integer(l.name.data(), l.lo, l.hi, def, help);
+}
+
+// The module-wide state an export touches, as the lock that guards it.
+consteval State state_of(std::string_view exported) {
+  const pfx::catalog::Export& e = pfx::catalog::kExports[pfx::catalog::index_of(exported)];
+  if ((e.needs & pfx::catalog::kWorkspace) != 0) return State::kBlurWorkspace;
+  if ((e.needs & pfx::catalog::kAutoParameters) != 0) return State::kAutoAdjust;
+  return State::kNone;
+}
 
 // ---- Shared parameters and helpers ----------------------------------------------------------
 
@@ -31,13 +68,13 @@ constexpr Choice kMirrorAxes[] = {{"horizontal", MIRROR_HORIZONTAL}, {"vertical"
 
 // The four auto-adjust parameters, in the order fx_set_hdr takes them.
 constexpr Param kThreshold =
-    integer("threshold", 0, 127, 70, "bright share (percent) at which weight2 replaces weight1");
+    level("fx_set_hdr", "threshold", "bright share (percent) at which weight2 replaces weight1");
 constexpr Param kCutOff =
-    integer("cutoff", 0, 100, 100, "lightness (percent) the brightest tone is mapped to");
+    level("fx_set_hdr", "cutoff", "lightness (percent) the brightest tone is mapped to");
 constexpr Param kWeight1 =
-    integer("weight1", 300, 8196, 1000, "evenness of the tone curve for most images");
+    level("fx_set_hdr", "weight1", "evenness of the tone curve for most images");
 constexpr Param kWeight2 =
-    integer("weight2", 300, 8196, 5120, "the same for images that are mostly bright");
+    level("fx_set_hdr", "weight2", "the same for images that are mostly bright");
 
 // The auto-adjust parameters are module-wide. A run sets them from its own parameters k..k+3
 // and puts back what it found when it is done, so that every picture of a gallery (downlight
@@ -126,51 +163,55 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "lighter or darker: moves the luma and keeps the colour",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 keeps the luma, though the "
-                        "YCbCr round trip still moves most colours a step")},
+     .params = {level("controlBrightness", "level", "slider position; 10 keeps the luma, "
+                      "though the YCbCr round trip still moves most colours a step")},
      .run = full_and_partial<controlBrightness, controlBrightnessPartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
     {.name = "contrast",
      .family = "adjust",
      .summary = "pushes each channel away from mid grey, or draws it toward it below 10",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .params = {level("controlContrast", "level",
+                      "slider position; 10 leaves the image as it is")},
      .run = full_and_partial<controlContrast, controlContrastPartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
     {.name = "saturation",
      .family = "adjust",
      .summary = "more or less colourful: 0 is grey, 20 about doubles each colour's distance from it",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .params = {level("controlSaturation", "level",
+                      "slider position; 10 leaves the image as it is")},
      .run = full_and_partial<controlSaturation, controlSaturationPartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
     {.name = "temperature",
      .family = "adjust",
      .summary = "warmer above 10 (more red, less blue), cooler below",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 shifts no chroma, though the "
-                        "YCbCr round trip still moves most colours a step")},
+     .params = {level("controlTemperature", "level", "slider position; 10 shifts no chroma, "
+                      "though the YCbCr round trip still moves most colours a step")},
      .run = full_and_partial<controlTemperature, controlTemperaturePartial>,
      .gallery = "level=0;level=5;level=15;level=20"},
     {.name = "exposure",
      .family = "adjust",
      .summary = "each channel times level / 10: 0 is black, 20 doubles",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .params = {level("controlExposure", "level",
+                      "slider position; 10 leaves the image as it is")},
      .run = full_and_partial<controlExposure, controlExposurePartial>,
      .gallery = "level=5;level=15;level=20"},
     {.name = "hue",
      .family = "adjust",
      .summary = "turns every colour round the colour wheel, 18 degrees per step",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 leaves the image as it is")},
+     .params = {level("controlHue", "level",
+                      "slider position; 10 leaves the image as it is")},
      .run = full_and_partial<controlHue, controlHuePartial>,
      .gallery = "level=0;level=5;level=15"},
     {.name = "faded-colour",
      .family = "adjust",
      .summary = "blends toward a washed-out, warm-tinted copy",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 100, 0, "percent faded; 0 leaves the image as it is")},
+     .params = {level("controlFadedColour", "level", "percent faded; 0 leaves the image as it is")},
      .run = full_and_partial<controlFadedColour, controlFadedColourPartial>,
      .gallery = "level=25;level=50;level=100"},
     {.name = "invert",
@@ -184,16 +225,17 @@ constexpr Effect kEffects[] = {
      .family = "adjust",
      .summary = "a slider per channel: a step adds 6 to its channel and takes 3 from the others",
      .selects = Selects::kMask,
-     .params = {integer("red", 0, 20, 10, "red slider; 10 moves no channel"),
-                integer("green", 0, 20, 10, "green slider; 10 moves no channel"),
-                integer("blue", 0, 20, 10, "blue slider; 10 moves no channel")},
+     .params = {level("controlAdjustRGB", "red", "red slider; 10 moves no channel"),
+                level("controlAdjustRGB", "green", "green slider; 10 moves no channel"),
+                level("controlAdjustRGB", "blue", "blue slider; 10 moves no channel")},
      .run = full_and_partial<controlAdjustRGB, AdjustRGB>,
      .gallery = "red=20;green=20;blue=20;red=14,green=12,blue=4"},
     {.name = "colour-tone",
      .family = "adjust",
      .summary = "repaints the picture in one hue at low saturation",
      .selects = Selects::kKeep,
-     .params = {integer("hue", 0, 360, 30, "the hue in degrees: 0 red, 120 green, 240 blue")},
+     .params = {level("fx_change_colortone", "hue", 30,
+                      "the hue in degrees: 0 red, 120 green, 240 blue")},
      .run = full_only<fx_change_colortone>,
      .gallery = "hue=30;hue=200"},
     {.name = "lighten",
@@ -203,7 +245,7 @@ constexpr Effect kEffects[] = {
      .writes = Writes::kSome,
      .params = {column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
-                integer("strength", 0, 255, 64, "how much the centre's channels rise"),
+                level("rubLighten", "strength", 64, "how much the centre's channels rise"),
                 length("radius", 1, 250, "the disc's radius in pixels")},
      .run = [](const Call& c) {
        rubLighten(c.dst, c.arg(0), c.arg(1), c.width, c.height, c.arg(2), c.arg(3));
@@ -217,7 +259,7 @@ constexpr Effect kEffects[] = {
      .writes = Writes::kSome,
      .params = {column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
-                integer("strength", 0, 255, 64, "how much the centre's channels fall"),
+                level("rubDarken", "strength", 64, "how much the centre's channels fall"),
                 length("radius", 1, 250, "the disc's radius in pixels")},
      .run = [](const Call& c) {
        rubDarken(c.dst, c.arg(0), c.arg(1), c.width, c.height, c.arg(2), c.arg(3));
@@ -230,7 +272,8 @@ constexpr Effect kEffects[] = {
      .family = "blur",
      .summary = "soft blur of the selection, or of everything, on a scaled-down copy",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
+     .params = {level("applyBlur", "level", 4,
+                      "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
      .run = [](const Call& c) {
        const Bounds& b = c.bounds;
        applyBlur(c.src, c.mask, c.dst, c.width, c.height, c.arg(0), b.left, b.right,
@@ -242,8 +285,9 @@ constexpr Effect kEffects[] = {
      .family = "blur",
      .summary = "the same blur through a preview session, as an editor's slider runs it",
      .selects = Selects::kMask,
-     .state = State::kBlurWorkspace,
-     .params = {integer("level", 0, 8, 4, "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
+     .state = state_of("fx_Init_blur"),
+     .params = {level("fx_make_blur_preview", "level", 4,
+                      "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
      .run = [](const Call& c) {
        const Bounds& b = c.bounds;
        fx_Init_blur(c.src, c.mask, c.width, c.height, b.left, b.right, b.top, b.bottom);
@@ -264,7 +308,7 @@ constexpr Effect kEffects[] = {
      .family = "blur",
      .summary = "the same tilt-shift through a preview session",
      .selects = Selects::kKeep,
-     .state = State::kBlurWorkspace,
+     .state = state_of("initTiltShift"),
      .params = {row("centre", 500, "the row in the middle of the sharp band"),
                 rows("half-height", 125, "rows kept sharp on each side of the centre")},
      .run = [](const Call& c) {
@@ -297,7 +341,8 @@ constexpr Effect kEffects[] = {
      .family = "retouch",
      .summary = "a mosaic of square blocks, each the colour of its top-left pixel",
      .selects = Selects::kKeep,
-     .params = {integer("shift", 0, 31, 3, "blocks of 2^shift pixels a side; 0 changes nothing")},
+     .params = {level("applyPixelize", "shift", 3,
+                      "blocks of 2^shift pixels a side; 0 changes nothing")},
      .run = full_only<applyPixelize>,
      .gallery = "shift=3;shift=5"},
     {.name = "pixelize-brush",
@@ -305,7 +350,8 @@ constexpr Effect kEffects[] = {
      .summary = "brush: the same mosaic inside a disc, on the grid of the whole picture",
      .selects = Selects::kKeep,
      .writes = Writes::kSome,
-     .params = {integer("shift", 0, 31, 4, "blocks of 2^shift pixels a side; 0 changes nothing"),
+     .params = {level("rubPixelize", "shift", 4,
+                      "blocks of 2^shift pixels a side; 0 changes nothing"),
                 column("cx", 500, "the disc's centre column"),
                 row("cy", 500, "the disc's centre row"),
                 length("radius", 0, 250, "the disc's radius in pixels")},
@@ -345,8 +391,8 @@ constexpr Effect kEffects[] = {
      .summary = "stretches low..high over the whole range: more contrast, the ends clipped",
      .selects = Selects::kKeep,
      .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
-                integer("low", 0, 255, 0, "the value that becomes 0"),
-                integer("high", 0, 255, 255, "the value that becomes 255; above low")},
+                level("changeHistogramByInput", "low", "the value that becomes 0"),
+                level("changeHistogramByInput", "high", "the value that becomes 255; above low")},
      .run = levels<changeHistogramByInput>,
      .gallery = "low=40,high=215"},
     {.name = "output-levels",
@@ -354,8 +400,8 @@ constexpr Effect kEffects[] = {
      .summary = "squeezes the whole range into low..high: less contrast",
      .selects = Selects::kKeep,
      .params = {choice("channel", kChannels, 0, "the colour channel the curve changes"),
-                integer("low", 0, 255, 0, "what 0 becomes"),
-                integer("high", 0, 255, 255, "what 255 becomes; above low")},
+                level("changeHistogramByOutput", "low", "what 0 becomes"),
+                level("changeHistogramByOutput", "high", "what 255 becomes; above low")},
      .run = levels<changeHistogramByOutput>,
      .gallery = "low=40,high=215"},
 
@@ -364,7 +410,8 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "grey from the mean of the channels, lighter above 10 and darker below",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 20, 10, "slider position; 10 keeps the grey's brightness")},
+     .params = {level("controlGreyscale", "level",
+                      "slider position; 10 keeps the grey's brightness")},
      .run = full_and_partial<controlGreyscale, controlGreyscalePartial>,
      .gallery = "level=5;level=10;level=15"},
     {.name = "sepia",
@@ -436,7 +483,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "a slight blur, bright tones lifted and dark ones lowered",
      .selects = Selects::kMask,
-     .params = {integer("level", 0, 100, 50, "strength of the tone curve; 0 only blurs")},
+     .params = {level("applySoftglow", "level", 50, "strength of the tone curve; 0 only blurs")},
      .run = full_and_partial<applySoftglow, applySoftglowPartial>,
      .gallery = "level=50;level=100"},
     {.name = "retro",
@@ -459,7 +506,7 @@ constexpr Effect kEffects[] = {
      .family = "looks",
      .summary = "preset: faded and auto-adjusted, soft and dim; takes auto adjust's parameters",
      .selects = Selects::kMask,
-     .state = State::kAutoAdjust,
+     .state = state_of("applyDownlight"),
      .writes = Writes::kAllWhenWhole,
      .params = {kThreshold, kCutOff, kWeight1, kWeight2},
      .run = [](const Call& c) {
@@ -514,7 +561,7 @@ constexpr Effect kEffects[] = {
      .params = {column("cx", 500, "the circle's centre column"),
                 row("cy", 500, "the circle's centre row"),
                 length("radius", 1, 250, "the nominal radius in pixels"),
-                integer("level", -100, 100, 60, "strength: above 0 bulges, below 0 pinches"),
+                level("runSphericity", "level", 60, "strength: above 0 bulges, below 0 pinches"),
                 choice("fast", kOffOn, 0, "on: every second pixel, filled in 2 x 2 blocks")},
      .run = circle_warp<runSphericity>,
      .gallery = "level=100;level=-100"},
@@ -526,8 +573,8 @@ constexpr Effect kEffects[] = {
      .params = {column("cx", 500, "the circle's centre column"),
                 row("cy", 500, "the circle's centre row"),
                 length("radius", 1, 400, "the circle's radius in pixels"),
-                integer("angle", -360, 360, 90, "degrees at the centre; below 0 turns the other "
-                        "way"),
+                level("runTwirl", "angle", 90,
+                      "degrees at the centre; below 0 turns the other way"),
                 choice("fast", kOffOn, 0, "on: every second pixel, filled in 2 x 2 blocks")},
      .run = circle_warp<runTwirl>,
      .gallery = "angle=90;angle=-270,fast=on"},
@@ -537,7 +584,7 @@ constexpr Effect kEffects[] = {
      .family = "auto",
      .summary = "tone mapping from the picture's histogram (contrast 12 under 150 pixels a side)",
      .selects = Selects::kKeep,
-     .state = State::kAutoAdjust,
+     .state = state_of("applyAutoAdjust"),
      .params = {kThreshold, kCutOff, kWeight1, kWeight2},
      .run = [](const Call& c) {
        const AutoAdjustSettings settings(c, 0);

@@ -34,6 +34,11 @@ constexpr int64_t kMaxPixels = INT32_MAX / 4;
 // pixel: 1 GB at most for one picture.
 constexpr int64_t kDefaultMaxPixels = 250'000'000;
 
+// The quality JPEG and lossy WebP files are written at unless the caller says otherwise. Hosts
+// that write files (the tool, the Python batch) share it: their outputs are the same pixels only
+// with the same encoder settings.
+constexpr int32_t kDefaultQuality = 92;
+
 // Inclusive pixel bounds, in the order the library takes them.
 struct Bounds {
   int32_t left, right, top, bottom;

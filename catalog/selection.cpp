@@ -35,6 +35,21 @@ constexpr int32_t kMaxRadius = 32767;
 
 }  // namespace
 
+std::vector<uint8_t> mask_of_picture(const uint32_t* pixels, int32_t width, int32_t height) {
+  // grey * alpha against 128 * 255 rather than a division: exact, and 8 + 8 bits fit easily.
+  constexpr uint32_t kThreshold = 128;
+  const size_t n =
+      width > 0 && height > 0 ? static_cast<size_t>(width) * static_cast<size_t>(height) : 0;
+  std::vector<uint8_t> selected(n);
+  for (size_t i = 0; i < n; ++i) {
+    const uint32_t p = pixels[i];
+    const uint32_t grey =
+        (77 * ((p >> 16) & 0xFF) + 150 * ((p >> 8) & 0xFF) + 29 * (p & 0xFF)) >> 8;
+    selected[i] = grey * (p >> 24) >= kThreshold * 255 ? 1 : 0;
+  }
+  return selected;
+}
+
 std::string parse_rect(std::string_view text, Shape& out) {
   int32_t v[4];
   if (!parse_four(text, v)) {

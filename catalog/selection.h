@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "catalog/effects.h"
 
@@ -23,6 +24,12 @@ struct MaskRef {
   int32_t width = 0, height = 0;
   std::string name;
 };
+
+// A mask the host has decoded from a picture (a file: 0xAARRGGBB words, width x height) as the
+// bytes MaskRef takes: a pixel is selected when its grey value, the luma (77 R + 150 G + 29 B) /
+// 256 scaled by alpha / 255, is 128 or more. Pictures without alpha are decoded opaque, so their
+// grey alone decides.
+std::vector<uint8_t> mask_of_picture(const uint32_t* pixels, int32_t width, int32_t height);
 
 struct SelectionRequest {
   bool has_rect = false, has_ellipse = false;

@@ -1,20 +1,12 @@
-// Old photo: the plain look's table, sizes beyond the vignette table, its partial rule over the
-// whole image; the textured look over transparent pixels and in place.
+// Old photo: the plain look's table against its rule.
 #include <gtest/gtest.h>
 
 #include <cmath>
 #include <cstdint>
 
 #include "photofx.h"
-#include "support/images.h"
 
 namespace {
-
-using pfx::test::argb;
-using pfx::test::Mask;
-using pfx::test::Pixels;
-
-constexpr uint32_t kGrey = 0xFF808080u;
 
 // (v - 128) / 10 rounded away from zero.
 TEST(OldPhoto, TableFollowsItsRule) {

@@ -1,5 +1,4 @@
-// Soft glow: the kernel, the value curve, levels out of range, and in-place calls giving the
-// result of two buffers.
+// Soft glow: the value curve by level, on an image too small for the blur kernel.
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -11,7 +10,6 @@
 namespace {
 
 using pfx::test::argb;
-using pfx::test::Mask;
 using pfx::test::Pixels;
 
 uint32_t grey(uint32_t v) { return argb(0xFF, v, v, v); }

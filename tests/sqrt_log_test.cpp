@@ -1,11 +1,8 @@
-// Integer square root and the table-driven logarithm: rounding of the root at every boundary,
-// the table against its rule, the interpolation over its whole range and outside it, and the
-// argument ranges of the logarithm.
+// The logarithm's breakpoint table against its rule, entry by entry.
 #include <gtest/gtest.h>
 
 #include <cmath>
 #include <cstdint>
-#include <vector>
 
 #include "fixmath/fixed.h"
 #include "photofx.h"

@@ -1,15 +1,11 @@
-// Tilt-shift: the row weights of the sharp band and its fade, the fade-length boundary, the
-// workspace life cycle, one-shot and preview agreeing and the lens variant's luma blend. (Failed
-// allocations are in the allocation-failure table.)
+// Tilt-shift: the row weights of the sharp band and its fade, the fade-length boundary and
+// centres far outside the image. (Failed allocations are in the allocation-failure table.)
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <cstdint>
 #include <iterator>
-#include <tuple>
 #include <vector>
 
-#include "frame/alloc_hook.h"
 #include "photofx.h"
 #include "support/images.h"
 
@@ -18,17 +14,6 @@ namespace {
 using pfx::test::Pixels;
 using Bytes = std::vector<uint8_t>;
 
-constexpr uint32_t kUntouched = 0xA5A5A5A5u;
-
-class TiltShift : public ::testing::Test {
- protected:
-  void SetUp() override { fx_destroy_blur(); }
-  void TearDown() override {
-    pfx::arm_allocation_failure(0);
-    fx_destroy_blur();
-  }
-};
-
 // Sharpness weight of every row of a 2-pixel-wide image of the given height, read back through
 // restore_tiltshift: the source is red 255 / green 0 and the blurred image green 255 / red 0,
 // so green comes out as 255 - w (0 at 256) and red as w - 1 (0 at 0).
@@ -36,7 +21,7 @@ std::vector<int32_t> row_weights(int32_t height, int32_t centre, int32_t half_he
   const Pixels src(static_cast<size_t>(2) * height, 0x40FF0000u);
   Bytes blur(2 * 2 * 3, 0);
   for (size_t i = 0; i < 4; ++i) blur[3 * i + 1] = 255;
-  Pixels dst(src.size(), kUntouched);
+  Pixels dst(src.size(), 0xA5A5A5A5u);
   restore_tiltshift(src.data(), blur.data(), dst.data(), 2, height, 2, 2, centre, half_height);
   std::vector<int32_t> w;
   for (int32_t y = 0; y < height; ++y) {
@@ -85,7 +70,5 @@ TEST(TiltShiftRows, WeightFallsLinearlyFromTheBandAndShortFadesKeepTheSource) {
   }
   EXPECT_EQ(row_weights(10, INT32_MAX, INT32_MAX), std::vector<int32_t>(10, 256));
 }
-
-using TiltFn = void (*)(const uint32_t*, uint32_t*, int32_t, int32_t, int32_t, int32_t);
 
 }  // namespace

@@ -13,11 +13,8 @@
 namespace {
 
 constexpr double kPi = std::numbers::pi;
-constexpr int32_t kStep = 0x8000;  // one table step, half a unit (1/512 turn)
 constexpr int32_t kQuarter = 0x400000;
-constexpr int32_t kHalf = 0x800000;
 constexpr int32_t kPole = -0x7FFFFFFF;
-constexpr int32_t kDomain = 33;  // the error word after an argument outside the domain
 
 int32_t& err() { return pfx::fix_error_word(); }
 

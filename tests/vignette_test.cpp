@@ -1,5 +1,4 @@
-// Vignette: the table and its rule beyond 255, images too small to divide by and too large for
-// the table.
+// Vignette: the fall-off table against its rule, within the table and beyond it.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -11,9 +10,6 @@
 #include "support/images.h"
 
 namespace {
-
-using pfx::test::argb;
-using pfx::test::Pixels;
 
 // 2^24 / k^2, truncated, and 2^24 for k <= 1.
 double vignette_rule(double k) { return k <= 1 ? 16777216.0 : std::floor(16777216.0 / (k * k)); }

@@ -12,9 +12,6 @@
 namespace {
 
 constexpr double kPi = 3.14159265358979323846;
-constexpr uint32_t kDeg = 524288;  // one degree in warp-angle units
-constexpr uint32_t k45 = 45 * kDeg, k90 = 90 * kDeg, k180 = 180 * kDeg, k270 = 270 * kDeg,
-                   k360 = 360 * kDeg;
 
 TEST(AtanTable, EveryEntryIsTheRoundedArctangentInDegreesTimes2To19) {
   for (int32_t i = 0; i < 2048; ++i) {

@@ -29,17 +29,8 @@ namespace {
 
 using fxcat::Step;
 
-// A mask file selects a pixel whose grey value is at least this: grey is the luma
-// (77 R + 150 G + 29 B) / 256, scaled by alpha / 255 where the file has alpha.
-constexpr uint32_t kMaskThreshold = 128;
-
-bool mask_selects(uint32_t pixel) {
-  const uint32_t r = (pixel >> 16) & 0xFF, g = (pixel >> 8) & 0xFF, b = pixel & 0xFF;
-  const uint32_t grey = (77 * r + 150 * g + 29 * b) >> 8;
-  return grey * (pixel >> 24) >= kMaskThreshold * 255;
-}
-
-// A mask file, read once for every input, as the bytes a selection takes.
+// A mask file, read once for every input, as the bytes a selection takes (the catalogue's
+// mask_of_picture says which pixels it selects).
 struct MaskFile {
   int32_t width = 0, height = 0;
   std::vector<uint8_t> bytes;
@@ -52,8 +43,7 @@ std::string read_mask(const std::string& path, int64_t max_pixels, MaskFile& out
   }
   out.width = m.width;
   out.height = m.height;
-  out.bytes.resize(m.pixels.size());
-  for (size_t i = 0; i < m.pixels.size(); ++i) out.bytes[i] = mask_selects(m.pixels[i]) ? 1 : 0;
+  out.bytes = fxcat::mask_of_picture(m.pixels.data(), m.width, m.height);
   return {};
 }
 
@@ -267,7 +257,7 @@ int apply(std::span<const std::string> words) {
   const std::string err = fxcat::parse_chain(words, &options, steps);
   if (options.help) {
     if (steps.size() == 1) return help_effect(*steps[0].effect);
-    std::fputs(kUsageText, stdout);
+    std::fputs(usage_text().c_str(), stdout);
     return kDone;
   }
   if (!err.empty()) return usage_error(err);
@@ -353,7 +343,8 @@ int apply(std::span<const std::string> words) {
       .max_pixels = options.max_pixels,
       .strip = options.strip,
       .auto_orient = options.auto_orient,
-      .write = {.quality = options.quality != 0 ? static_cast<int>(options.quality) : 92,
+      .write = {.quality = options.quality != 0 ? static_cast<int>(options.quality)
+                                                : fxcat::kDefaultQuality,
                 .lossless = options.lossless}};
   const bool terminal = isatty(STDERR_FILENO) != 0;
   const Progress::Mode mode = terminal && (options.progress || !options.out_dir.empty())

@@ -19,7 +19,7 @@ void say(const std::string& message);
 int usage_error(const std::string& message);
 
 // The usage text `photofx help` prints, within 80 columns.
-extern const char* const kUsageText;
+std::string usage_text();
 
 std::string base_name(const std::string& path);
 

@@ -72,8 +72,8 @@ std::string decode_image(const unsigned char* data, size_t size, Image& out,
                          const ReadOptions& options = {});
 
 struct WriteOptions {
-  int quality = 92;       // JPEG and lossy WebP, 1..100
-  bool lossless = false;  // WebP
+  int quality = fxcat::kDefaultQuality;  // JPEG and lossy WebP, 1..100
+  bool lossless = false;                 // WebP
   const Metadata* metadata = nullptr;
 };
 

@@ -31,47 +31,54 @@
 
 namespace fxtool {
 
-const char* const kUsageText =
-    "usage:\n"
-    "  photofx list                  every effect, its parameters and their ranges\n"
-    "  photofx help [EFFECT]         this text, or one effect explained\n"
-    "  photofx apply STEP [, STEP]... [options] IN OUT\n"
-    "  photofx apply STEP [, STEP]... [options] --out-dir DIR IN...\n"
-    "  photofx gallery [IN] [-o DIR] [--only EFFECT,...]\n"
-    "  photofx --version\n"
-    "\n"
-    "A STEP is an effect with its parameters (--level 13 or --level=13) and its\n"
-    "selection. Steps are separated by a lone ',' and run in order on the decoded\n"
-    "picture, which is encoded once at the end:\n"
-    "  photofx apply brightness --level 13 , contrast --level 12 ,\n"
-    "                vintage --ellipse 300,200,120,80 in.jpg out.jpg\n"
-    "\n"
-    "selection (a pixel is edited when every option given selects it; none: all):\n"
-    "  --rect X,Y,W,H         columns X..X+W-1, rows Y..Y+H-1\n"
-    "  --ellipse CX,CY,RX,RY  centre and radii in pixels, edge included\n"
-    "  --mask FILE            an image of the same size: grey 128 or more selects\n"
-    "                         (grey = (77 R + 150 G + 29 B) / 256 x alpha / 255)\n"
-    "\n"
-    "files: PNG, JPEG, WebP or TIFF, read by content, written by the extension of\n"
-    "OUT (.png, .jpg, .jpeg, .webp, .tif, .tiff). EXIF, ICC profile and XMP are\n"
-    "copied to the output.\n"
-    "  --quality N            JPEG and lossy WebP quality, 1..100 (92)\n"
-    "  --lossless             lossless WebP\n"
-    "  --strip                leave out EXIF, ICC profile and XMP\n"
-    "  --auto-orient          turn the picture upright by its EXIF orientation first\n"
-    "  --max-pixels N         refuse larger pictures unread (250000000)\n"
-    "\n"
-    "batches:\n"
-    "  --out-dir DIR          write each IN to DIR under its own name\n"
-    "  --format EXT           ... with this extension (png, jpg, webp, tif, ...)\n"
-    "  -j N, --jobs N         files at once (default: one per core)\n"
-    "  --progress             show progress even when stderr is not a terminal\n"
-    "\n"
-    "gallery: one PNG per effect setting, contact-sheet.png and index.html in DIR\n"
-    "(default: gallery); without IN, the bundled sample photograph.\n"
-    "\n"
-    "Exit status: 0 done, 1 a file could not be read, processed or written,\n"
-    "2 a bad command line.\n";
+std::string usage_text() {
+  const std::string quality = std::to_string(fxcat::kDefaultQuality);
+  const std::string max_pixels = std::to_string(fxcat::kDefaultMaxPixels);
+  return "usage:\n"
+         "  photofx list                  every effect, its parameters and their ranges\n"
+         "  photofx help [EFFECT]         this text, or one effect explained\n"
+         "  photofx apply STEP [, STEP]... [options] IN OUT\n"
+         "  photofx apply STEP [, STEP]... [options] --out-dir DIR IN...\n"
+         "  photofx gallery [IN] [-o DIR] [--only EFFECT,...]\n"
+         "  photofx --version\n"
+         "\n"
+         "A STEP is an effect with its parameters (--level 13 or --level=13) and its\n"
+         "selection. Steps are separated by a lone ',' and run in order on the decoded\n"
+         "picture, which is encoded once at the end:\n"
+         "  photofx apply brightness --level 13 , contrast --level 12 ,\n"
+         "                vintage --ellipse 300,200,120,80 in.jpg out.jpg\n"
+         "\n"
+         "selection (a pixel is edited when every option given selects it; none: all):\n"
+         "  --rect X,Y,W,H         columns X..X+W-1, rows Y..Y+H-1\n"
+         "  --ellipse CX,CY,RX,RY  centre and radii in pixels, edge included\n"
+         "  --mask FILE            an image of the same size: grey 128 or more selects\n"
+         "                         (grey = (77 R + 150 G + 29 B) / 256 x alpha / 255)\n"
+         "\n"
+         "files: PNG, JPEG, WebP or TIFF, read by content, written by the extension of\n"
+         "OUT (.png, .jpg, .jpeg, .webp, .tif, .tiff). EXIF, ICC profile and XMP are\n"
+         "copied to the output.\n"
+         "  --quality N            JPEG and lossy WebP quality, 1..100 (" +
+         quality +
+         ")\n"
+         "  --lossless             lossless WebP\n"
+         "  --strip                leave out EXIF, ICC profile and XMP\n"
+         "  --auto-orient          turn the picture upright by its EXIF orientation first\n"
+         "  --max-pixels N         refuse larger pictures unread (" +
+         max_pixels +
+         ")\n"
+         "\n"
+         "batches:\n"
+         "  --out-dir DIR          write each IN to DIR under its own name\n"
+         "  --format EXT           ... with this extension (png, jpg, webp, tif, ...)\n"
+         "  -j N, --jobs N         files at once (default: one per core)\n"
+         "  --progress             show progress even when stderr is not a terminal\n"
+         "\n"
+         "gallery: one PNG per effect setting, contact-sheet.png and index.html in DIR\n"
+         "(default: gallery); without IN, the bundled sample photograph.\n"
+         "\n"
+         "Exit status: 0 done, 1 a file could not be read, processed or written,\n"
+         "2 a bad command line.\n";
+}
 
 void say(const std::string& message) { std::fprintf(stderr, "photofx: %s\n", message.c_str()); }
 
@@ -160,7 +167,7 @@ int list_effects() {
 
 int help(fxcat::Words& args) {
   if (args.done()) {
-    std::fputs(kUsageText, stdout);
+    std::fputs(usage_text().c_str(), stdout);
     return kDone;
   }
   const std::string name = args.next();
@@ -183,7 +190,7 @@ int gallery(fxcat::Words& args) {
     }
     fxcat::Option opt = fxcat::split_option(text);
     if (opt.name == "help" || text == "-h") {
-      std::fputs(kUsageText, stdout);
+      std::fputs(usage_text().c_str(), stdout);
       return kDone;
     }
     const bool is_dir = text == "-o" || opt.name == "out-dir";
@@ -236,7 +243,7 @@ int gallery(fxcat::Words& args) {
 
 int run(int argc, char** argv) {
   if (argc < 2) {
-    std::fputs(kUsageText, stderr);
+    std::fputs(usage_text().c_str(), stderr);
     return kUsage;
   }
   const std::string command = argv[1];

@@ -18,9 +18,9 @@ import numpy as np
 from . import _catalog
 from . import _photofx as _ext
 
-# The tool's quality for JPEG and lossy WebP: lossy outputs are pixel-identical to the tool's
-# only with the same encoder settings.
-QUALITY = 92
+# The tool's quality for JPEG and lossy WebP, from the catalogue: lossy outputs are
+# pixel-identical to the tool's only with the same encoder settings.
+QUALITY = _ext.QUALITY
 
 _FORMATS = {
     ".png": "PNG",
@@ -53,7 +53,7 @@ def _word(value):
         return repr(value)
     if isinstance(value, (tuple, list)):
         return ",".join(str(int(v)) for v in value)
-    return str(value)
+    return os.fspath(value) if isinstance(value, os.PathLike) else str(value)
 
 
 def chain_words(steps):
@@ -69,13 +69,22 @@ def chain_words(steps):
             words.append(",")
         words.append(effect.name)
         for key, value in dict(params).items():
-            if key == "mask":
-                raise ValueError(f"{effect.function}: batch steps select with rect= or ellipse=")
+            if key == "mask" and not isinstance(value, (str, os.PathLike)):
+                raise TypeError(
+                    f"{effect.function}: a batch step's mask is an image file's name, "
+                    f"not {type(value).__name__}"
+                )
             p = effect.param(key)
             option = p.option if p is not None else key
             words += ["--" + option, _word(value)]
     _ext.check_chain(words)
     return words
+
+
+def _mask_files(words):
+    """The mask file each step names (None: none), resolved as the tool resolves it: against the
+    working directory of the process given the chain, not the worker's."""
+    return [None if p is None else os.path.abspath(p) for p in _ext.mask_paths(words)]
 
 
 # ---- One file -----------------------------------------------------------------------------------
@@ -143,16 +152,22 @@ def _write(words, path):
         raise
 
 
-def _apply(input, output, words, max_pixels):
-    with _open(input, max_pixels) as image:
-        words_in = _to_words(image)
-    _write(_ext.run_chain(words, words_in), output)
+def _read(path, max_pixels):
+    with _open(path, max_pixels) as image:
+        return _to_words(image)
 
 
-def _task(input, output, words, max_pixels):
+def _apply(input, output, words, masks, max_pixels):
+    # Mask files are read as the tool reads them, under the same limit; the catalogue decides
+    # which of their pixels select.
+    pictures = [None if m is None else _read(m, max_pixels) for m in masks]
+    _write(_ext.run_chain(words, _read(input, max_pixels), pictures), output)
+
+
+def _task(input, output, words, masks, max_pixels):
     """A worker's task: None, or why the file failed."""
     try:
-        _apply(input, output, words, max_pixels)
+        _apply(input, output, words, masks, max_pixels)
         return None
     except MemoryError:
         return f"{input}: out of memory"
@@ -173,7 +188,8 @@ def apply_file(input, output, steps, *, max_pixels=_ext.MAX_PIXELS):
     output = os.fspath(output)
     if os.path.splitext(output)[1].lower() not in _FORMATS:
         raise ValueError(f"{output}: unknown image format (use {_NAMES})")
-    _apply(os.fspath(input), output, chain_words(steps), max_pixels)
+    words = chain_words(steps)
+    _apply(os.fspath(input), output, words, _mask_files(words), max_pixels)
 
 
 # ---- Many files -------------------------------------------------------------------------------
@@ -201,7 +217,9 @@ def batch(
     own name, with dask.distributed.
 
     steps: the tool's chain syntax ("brightness --level 13 , vintage --rect 0,0,300,200") or a
-        list of steps, each an effect name or (effect, {param: value}).
+        list of steps, each an effect name or (effect, {param: value}). A step's mask file
+        (--mask FILE, or mask="FILE") is read on the workers, a relative name resolved against
+        this process's working directory, as the tool resolves it.
     client: None starts a LocalCluster of `workers` processes (default: one per CPU) for this
         batch; a distributed.Client, or a scheduler's address, runs on that cluster.
     max_pixels: larger files are refused (the tool's limit by default).
@@ -215,6 +233,7 @@ def batch(
     from distributed import Client, LocalCluster, wait
 
     words = chain_words(steps)
+    masks = _mask_files(words)
     inputs = [os.fspath(i) for i in inputs]
     outputs = [_output_path(i, out_dir) for i in inputs]
     seen = set()
@@ -248,7 +267,7 @@ def batch(
         owned.append(client)
     try:
         futures = [
-            client.submit(_task, i, o, words, max_pixels, pure=False)
+            client.submit(_task, i, o, words, masks, max_pixels, pure=False)
             for i, o in zip(inputs, outputs)
         ]
         errors = {}

@@ -576,11 +576,8 @@ std::vector<fxcat::Step> chain_of(const std::vector<std::string>& words) {
       value_error(fxcat::step_label(steps, i) + "unexpected '" + steps[i].positional[0] +
                   "' (the files are batch's inputs)");
     }
-    if (!steps[i].mask_path.empty()) {
-      value_error(fxcat::step_label(steps, i) +
-                  "--mask files are not read by batch; select with --rect or --ellipse");
-    }
-    if (steps[i].selection.any() && steps[i].effect->selects == Selects::kNothing) {
+    const bool selected = steps[i].selection.any() || !steps[i].mask_path.empty();
+    if (selected && steps[i].effect->selects == Selects::kNothing) {
       value_error(fxcat::step_label(steps, i) + steps[i].effect->name +
                   " takes no selection (it changes the image's size)");
     }
@@ -590,10 +587,30 @@ std::vector<fxcat::Step> chain_of(const std::vector<std::string>& words) {
 
 const std::string kRunChain = "run_chain";
 
-// Runs a chain on a copy of `img`; the result may have another size.
-py::array run_chain(const std::vector<std::string>& words, py::handle img) {
-  const std::vector<fxcat::Step> steps = chain_of(words);
+// The mask file each step names, or None.
+py::list mask_paths(const std::vector<std::string>& words) {
+  py::list paths;
+  for (const fxcat::Step& step : chain_of(words)) {
+    paths.append(step.mask_path.empty() ? py::object(py::none()) : py::str(step.mask_path));
+  }
+  return paths;
+}
+
+// Runs a chain on a copy of `img`; the result may have another size. `masks` holds, for each
+// step that names a mask file, the file's pixels as the host decoded them, and None elsewhere.
+py::array run_chain(const std::vector<std::string>& words, py::handle img, const py::list& masks) {
+  std::vector<fxcat::Step> steps = chain_of(words);
   const Picture in = picture_arg(kRunChain, "img", img, Layout::kBgra);
+  if (masks.size() != steps.size()) value_error("run_chain: one mask or None per step");
+  std::vector<Picture> mask_pictures(steps.size());
+  for (size_t i = 0; i < steps.size(); ++i) {
+    if (steps[i].mask_path.empty()) continue;
+    if (masks[i].is_none()) {
+      value_error(fxcat::step_label(steps, i) + "--mask " + steps[i].mask_path + " was not read");
+    }
+    mask_pictures[i] = picture_arg(kRunChain, "mask", masks[i], Layout::kBgra);
+  }
+  std::vector<std::vector<uint8_t>> mask_bytes(steps.size());
   auto* pixels = new Pixels(in.words(), in.words() + in.size());
   const py::capsule owner(pixels, [](void* p) { delete static_cast<Pixels*>(p); });
   int32_t width = in.width, height = in.height;
@@ -602,6 +619,15 @@ py::array run_chain(const std::vector<std::string>& words, py::handle img) {
   std::string err;
   {
     const py::gil_scoped_release unlocked;
+    for (size_t i = 0; i < steps.size(); ++i) {
+      const Picture& m = mask_pictures[i];
+      if (m.data == nullptr) continue;
+      mask_bytes[i] = fxcat::mask_of_picture(m.words(), m.width, m.height);
+      steps[i].selection.mask = {.bytes = mask_bytes[i].data(),
+                                 .width = m.width,
+                                 .height = m.height,
+                                 .name = steps[i].mask_path};
+    }
     std::unique_lock<std::mutex> lock(g_state, std::defer_lock);
     if (stateful) lock.lock();
     err = fxcat::run_chain(steps, *pixels, width, height);
@@ -693,6 +719,7 @@ const std::string kSwap = "swap_red_blue";
 PYBIND11_MODULE(_photofx, m) {
   m.doc() = "The native half of photofx: the effect catalogue over numpy arrays.";
   m.attr("MAX_PIXELS") = fxcat::kDefaultMaxPixels;
+  m.attr("QUALITY") = fxcat::kDefaultQuality;
   m.attr("LIBRARY_MAX_PIXELS") = fxcat::kMaxPixels;
   m.def("catalog", &catalog,
         "Every effect with its parameters, as the command-line tool lists them.");
@@ -713,7 +740,10 @@ PYBIND11_MODULE(_photofx, m) {
       "The paper old_photo_texture mixes in, for a picture of this size.");
   m.def("split_words", &fxcat::split_words,
         "Splits a chain written as one string into its words, as the catalogue reads it.");
-  m.def("run_chain", &run_chain, "Runs a chain of steps on a copy of a uint32 (H, W) picture.");
+  m.def("mask_paths", &mask_paths, "The mask file each step of a chain names, or None.");
+  m.def("run_chain", &run_chain,
+        "Runs a chain of steps on a copy of a uint32 (H, W) picture, with the decoded pictures of "
+        "the steps' mask files (None for steps without).");
   m.def(
       "swap_red_blue",
       [](py::handle src, py::handle out) {

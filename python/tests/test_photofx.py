@@ -295,33 +295,44 @@ def test_the_stubs_list_every_effect_as_the_catalogue_says():
         assert f.read() == _stubs.render()
 
 
-CHAIN = "brightness --level 13 , vintage --ellipse 100,80,60,40 , twirl --angle -90 --radius 50"
-STEPS = [("brightness", {"level": 13}), ("vintage", {"ellipse": (100, 80, 60, 40)}),
-         ("twirl", {"angle": -90, "radius": 50})]
+# (a chain in the tool's syntax, the same as a list of steps); a relative mask file name is
+# resolved against the working directory, as the tool resolves it
+CHAINS = [
+    ("brightness --level 13 , vintage --ellipse 100,80,60,40 , twirl --angle -90 --radius 50",
+     [("brightness", {"level": 13}), ("vintage", {"ellipse": (100, 80, 60, 40)}),
+      ("twirl", {"angle": -90, "radius": 50})]),
+    ("sepia --mask mask.png , pixelize --shift 2 --mask=mask.png --rect 0,0,90,140",
+     [("sepia", {"mask": "mask.png"}),
+      ("pixelize", {"shift": 2, "mask": "mask.png", "rect": (0, 0, 90, 140)})]),
+]
 
 
-def test_a_cluster_batch_equals_the_serial_run_and_the_tool(tmp_path):
+@pytest.mark.parametrize("chain,steps", CHAINS)
+def test_a_cluster_batch_equals_the_serial_run_and_the_tool(tmp_path, monkeypatch, chain, steps):
+    tool = os.environ.get("PHOTOFX_TOOL") and os.path.abspath(os.environ["PHOTOFX_TOOL"])
+    monkeypatch.chdir(tmp_path)
+    photofx.to_pil(picture(9, 180, 140)).save("mask.png")  # grey and alpha both vary
+    os.mkdir("in")
     inputs = []
     for name, mode in (("a.png", "RGBA"), ("b.webp", "RGB"), ("c.jpg", "RGB"), ("d.png", "L"),
                        ("e.tif", "RGBA")):
-        inputs.append(str(tmp_path / name))
+        inputs.append(str(tmp_path / "in" / name))
         photofx.to_pil(picture(len(inputs), 180, 140) | 0x3F3F3F3F).convert(mode).save(inputs[-1])
-    inputs.append(str(tmp_path / "broken.png"))
+    inputs.append(str(tmp_path / "in" / "broken.png"))
     open(inputs[-1], "wb").write(b"not a picture")
-    results = photofx.batch(inputs, CHAIN, tmp_path / "out", workers=2, timeout=120, progress=False)
+    results = photofx.batch(inputs, chain, tmp_path / "out", workers=2, timeout=120, progress=False)
     assert [r.error is None for r in results] == [True] * 5 + [False]
     assert "broken.png" in results[-1].error
-    tool = os.environ.get("PHOTOFX_TOOL")
     for r in results[:-1]:
         serial = str(tmp_path / ("serial-" + os.path.basename(r.input)))
-        photofx.apply_file(r.input, serial, STEPS)
+        photofx.apply_file(r.input, serial, steps)
         assert open(r.output, "rb").read() == open(serial, "rb").read(), r.input
         if tool:
             mine = str(tmp_path / ("tool-" + os.path.basename(r.input)))
-            subprocess.run([tool, "apply", *CHAIN.split(), r.input, mine], check=True, timeout=60)
+            subprocess.run([tool, "apply", *chain.split(), r.input, mine], check=True, timeout=60)
             same = np.array_equal(np.asarray(Image.open(mine)), np.asarray(Image.open(r.output)))
             assert same, r.input
     with pytest.raises(ValueError, match="more than the limit of 1000 pixels"):
-        photofx.apply_file(inputs[0], tmp_path / "x.png", CHAIN, max_pixels=1000)
+        photofx.apply_file(inputs[0], tmp_path / "x.png", chain, max_pixels=1000)
     with pytest.raises(ValueError, match="step 2 .vintage.: vintage has no parameter --level"):
         photofx.batch(inputs, "brightness , vintage --level 3", tmp_path / "out")
