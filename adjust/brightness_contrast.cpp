@@ -7,6 +7,7 @@
 
 #include "adjust/brightness_contrast.h"
 #include "adjust/channel_map.h"
+#include "adjust/kernels.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "frame/table.h"
@@ -27,26 +28,30 @@ extern "C" {
 
 void fx_control_brightness_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                int32_t level) {
-  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Brightness(level)));
+  const pfx::Brightness rule(level);
+  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void fx_control_brightness(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                            int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                            int32_t bottom) {
+  const pfx::Brightness rule(level);
   pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                     pfx::on_pixels(pfx::Brightness(level)));
+                     pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void fx_control_contrast_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                              int32_t level) {
-  pfx::for_each_pixel_by_channel(src, dst, width, height, pfx::Contrast(level));
+  const pfx::Contrast rule(level);
+  pfx::for_each_pixel_by_channel(src, dst, width, height, rule, pfx::kernel_for(rule));
 }
 
 void fx_control_contrast(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                          int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                          int32_t bottom) {
+  const pfx::Contrast rule(level);
   pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                     pfx::on_pixels(pfx::Contrast(level)));
+                     pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void controlBrightness(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,

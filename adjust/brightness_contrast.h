@@ -27,6 +27,8 @@ class Brightness {
     return to_rgb(ycc.y + shift_, ycc.cb, ycc.cr);
   }
 
+  constexpr int32_t shift() const { return shift_; }
+
  private:
   int32_t shift_;
 };
@@ -51,6 +53,8 @@ class Contrast {
   }
 
   constexpr Rgb operator()(Rgb c) const { return {channel(c.r), channel(c.g), channel(c.b)}; }
+
+  constexpr int32_t steps() const { return d_; }
 
  private:
   int32_t d_;

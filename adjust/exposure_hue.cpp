@@ -9,6 +9,7 @@
 
 #include "adjust/channel_map.h"
 #include "adjust/exposure_hue.h"
+#include "adjust/kernels.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
 #include "frame/pixel.h"
@@ -23,15 +24,18 @@ constexpr int32_t status(bool done) { return done ? PHOTOFX_SUCCESS : PHOTOFX_IN
 // every pixel of the image, and a selected pixel is edited whether it lies inside the bounds or
 // not. Invalid bounds edit every pixel without reading the mask. As in the common frame, the
 // copy of the source and the edit are one pass.
-template <class Rule>
+template <class Rule, class Kernel>
 bool edit_mask_over_whole_image(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
-                                int32_t width, int32_t height, Rect bounds, const Rule& rule) {
+                                int32_t width, int32_t height, Rect bounds, const Rule& rule,
+                                const Kernel& kernel) {
   if (!partial_args_ok(src, mask, dst, width, height, bounds)) return false;
   const size_t n = static_cast<size_t>(pixel_count(width, height));
-  if (is_region(bounds)) {
-    map_selected_pixels(src, mask, dst, n, rule);
+  const uint8_t* selection = is_region(bounds) ? mask : nullptr;
+  const size_t done = neon_kernels() ? kernel(Run{src, selection, dst, n}) : 0;
+  if (selection != nullptr) {
+    map_selected_pixels(src + done, mask + done, dst + done, n - done, rule);
   } else {
-    map_pixels(src, dst, n, rule);
+    map_pixels(src + done, dst + done, n - done, rule);
   }
   return true;
 }
@@ -71,16 +75,19 @@ extern "C" {
 int32_t fx_control_exposure_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                 int32_t level) {
   if (src == nullptr || dst == nullptr) return PHOTOFX_INVALID_ARGUMENT;
-  return pfx::status(pfx::for_each_pixel_by_channel(src, dst, width, height, pfx::Exposure(level)));
+  const pfx::Exposure rule(level);
+  return pfx::status(
+      pfx::for_each_pixel_by_channel(src, dst, width, height, rule, pfx::kernel_for(rule)));
 }
 
 int32_t fx_control_exposure(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                             int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                             int32_t bottom) {
   if (src == nullptr || dst == nullptr) return PHOTOFX_INVALID_ARGUMENT;
+  const pfx::Exposure rule(level);
   return pfx::status(pfx::edit_mask_over_whole_image(src, mask, dst, width, height,
                                                      {left, right, top, bottom},
-                                                     pfx::on_pixels(pfx::Exposure(level))));
+                                                     pfx::on_pixels(rule), pfx::kernel_for(rule)));
 }
 
 int32_t fx_control_hue_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,

@@ -27,6 +27,9 @@ class Exposure {
 
   constexpr Rgb operator()(Rgb c) const { return {channel(c.r), channel(c.g), channel(c.b)}; }
 
+  // The 16.16 factor, 0 .. 16678912.
+  constexpr uint32_t factor() const { return factor_; }
+
  private:
   static constexpr uint32_t held_factor(int32_t level) {
     const int64_t factor = int64_t{level} * 655360 / 100;

@@ -8,6 +8,7 @@
 #include <cstdint>
 
 #include "adjust/faded_invert.h"
+#include "adjust/kernels.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "photofx.h"
@@ -31,8 +32,9 @@ int32_t fx_control_fadedcolor_all(const uint32_t* src, uint32_t* dst, int32_t wi
   if (src == nullptr || dst == nullptr || !pfx::fade_level_ok(level)) {
     return PHOTOFX_INVALID_ARGUMENT;
   }
+  const pfx::Fade rule(level);
   return pfx::status(
-      pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Fade(level))));
+      pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(rule), pfx::kernel_for(rule)));
 }
 
 int32_t fx_control_fadedcolor(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
@@ -41,8 +43,9 @@ int32_t fx_control_fadedcolor(const uint32_t* src, const uint8_t* mask, uint32_t
   if (src == nullptr || mask == nullptr || dst == nullptr || !pfx::fade_level_ok(level)) {
     return PHOTOFX_INVALID_ARGUMENT;
   }
+  const pfx::Fade rule(level);
   return pfx::status(pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                                        pfx::on_pixels(pfx::Fade(level))));
+                                        pfx::on_pixels(rule), pfx::kernel_for(rule)));
 }
 
 int32_t fx_apply_invert_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {

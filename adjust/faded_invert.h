@@ -22,7 +22,6 @@ class Fade {
     return {red_.channel(c.r), green_.channel(c.g), blue_.channel(c.b)};
   }
 
- private:
   // The blend (255 * c * (100 - L) + (k * c + o) * L) / 25500 with a single truncating division,
   // so only the final value is rounded, gathered as (slope * c + offset) / 25500. For every
   // level 0..100 and channel 0..255 the sum lies in 0 .. 6502500, below 2^23, and never
@@ -36,6 +35,11 @@ class Fade {
     }
   };
 
+  constexpr const Line& red() const { return red_; }
+  constexpr const Line& green() const { return green_; }
+  constexpr const Line& blue() const { return blue_; }
+
+ private:
   static constexpr Line line(int32_t k, int32_t o, int32_t level) {
     return {255 * (100 - level) + k * level, o * level};
   }

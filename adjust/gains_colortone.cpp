@@ -10,6 +10,7 @@
 
 #include "adjust/channel_map.h"
 #include "adjust/gains_colortone.h"
+#include "adjust/kernels.h"
 #include "frame/frame.h"
 #include "frame/hsv.h"
 #include "frame/pixel.h"
@@ -56,14 +57,16 @@ extern "C" {
 
 void fx_adjust_RGB_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                        int32_t red, int32_t green, int32_t blue) {
-  pfx::for_each_pixel_by_channel(src, dst, width, height, pfx::Gains(red, green, blue));
+  const pfx::Gains rule(red, green, blue);
+  pfx::for_each_pixel_by_channel(src, dst, width, height, rule, pfx::kernel_for(rule));
 }
 
 void fx_adjust_RGB(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                    int32_t height, int32_t red, int32_t green, int32_t blue, int32_t left,
                    int32_t right, int32_t top, int32_t bottom) {
+  const pfx::Gains rule(red, green, blue);
   pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                     pfx::on_pixels(pfx::Gains(red, green, blue)));
+                     pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 int32_t fx_change_colortone(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,

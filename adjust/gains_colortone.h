@@ -20,6 +20,9 @@ class Gains {
     return {clamp_byte(c.r + dr_), clamp_byte(c.g + dg_), clamp_byte(c.b + db_)};
   }
 
+  // The offsets, -255..255.
+  constexpr Rgb offsets() const { return {dr_, dg_, db_}; }
+
  private:
   // Formed in 64 bits (levels may be anything) and held to +-255: an offset of 255 or more
   // already makes every channel 255 and one of -255 or less every channel 0, so the hold changes

@@ -6,6 +6,7 @@
 // depend only on the level: above 10 the image warms (less blue, more red), below it cools.
 #include <cstdint>
 
+#include "adjust/kernels.h"
 #include "adjust/saturation_temperature.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
@@ -15,26 +16,30 @@ extern "C" {
 
 void fx_control_saturation_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                int32_t level) {
-  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Saturation(level)));
+  const pfx::Saturation rule(level);
+  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void fx_control_saturation(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                            int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                            int32_t bottom) {
+  const pfx::Saturation rule(level);
   pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                     pfx::on_pixels(pfx::Saturation(level)));
+                     pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void fx_control_temperature_all(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                                 int32_t level) {
-  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(pfx::Temperature(level)));
+  const pfx::Temperature rule(level);
+  pfx::for_each_pixel(src, dst, width, height, pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void fx_control_temperature(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                             int32_t height, int32_t level, int32_t left, int32_t right, int32_t top,
                             int32_t bottom) {
+  const pfx::Temperature rule(level);
   pfx::edit_selected(src, mask, dst, width, height, {left, right, top, bottom},
-                     pfx::on_pixels(pfx::Temperature(level)));
+                     pfx::on_pixels(rule), pfx::kernel_for(rule));
 }
 
 void controlSaturation(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,

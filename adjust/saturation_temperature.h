@@ -28,6 +28,11 @@ class Saturation {
             clamp_byte((grey + s_ * c.b) >> 10)};
   }
 
+  constexpr int32_t strength() const { return s_; }
+  constexpr int32_t red_weight() const { return wr_; }
+  constexpr int32_t green_weight() const { return wg_; }
+  constexpr int32_t blue_weight() const { return wb_; }
+
  private:
   // The formula already holds the strength at 0 from level 0 down and at 2048 from level 20 up,
   // so holding the level to 0..20 first changes no result and keeps the product from
@@ -53,6 +58,9 @@ class Temperature {
     const YCbCr ycc = to_ycbcr(c);
     return to_rgb(ycc.y, ycc.cb + cb_, ycc.cr + cr_);
   }
+
+  constexpr int32_t cb_shift() const { return cb_; }
+  constexpr int32_t cr_shift() const { return cr_; }
 
  private:
   // From 1000 steps on either side of 10 the blue-difference shift passes +-3000 and the

@@ -5,9 +5,11 @@
 //
 // BARS is tab-separated text written by bench/report, one item per line:
 //   title <tab> TEXT
+//   unit <tab> TEXT                         what follows each value (default X, a multiple)
 //   panel <tab> TEXT                        starts a new column of bars
 //   bar <tab> LABEL <tab> X <tab> GOAL <tab> KIND
-// X and GOAL are multiples of memcpy (GOAL 0: none); KIND is met, missed, none or reference.
+// X and GOAL are multiples of memcpy (GOAL 0: none), or figures in the given unit; KIND is met,
+// missed, none or reference.
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
@@ -69,10 +71,10 @@ int32_t text_width(const std::string& s) {
   return static_cast<int32_t>(s.size()) * fxtool::kGlyphAdvance;
 }
 
-std::string multiple(double x) {
+std::string multiple(double x, const std::string& unit) {
   char buf[32];
-  std::snprintf(buf, sizeof buf, x >= 100 ? "%.0fX" : "%.3gX", x);
-  return buf;
+  std::snprintf(buf, sizeof buf, x >= 100 ? "%.0f" : "%.3g", x);
+  return buf + unit;
 }
 
 // The axis: whole decades around every value and goal.
@@ -87,7 +89,8 @@ struct Axis {
   }
 };
 
-bool read_bars(const char* path, std::string& title, std::vector<Panel>& panels) {
+bool read_bars(const char* path, std::string& title, std::string& unit,
+               std::vector<Panel>& panels) {
   std::ifstream in(path);
   if (!in) return false;
   std::string line;
@@ -99,6 +102,8 @@ bool read_bars(const char* path, std::string& title, std::vector<Panel>& panels)
     if (f.empty()) continue;
     if (f[0] == "title" && f.size() == 2) {
       title = f[1];
+    } else if (f[0] == "unit") {
+      unit = f.size() > 1 ? f[1] : "";
     } else if (f[0] == "panel" && f.size() == 2) {
       panels.push_back({f[1], {}});
     } else if (f[0] == "bar" && f.size() == 5 && !panels.empty()) {
@@ -120,7 +125,7 @@ Image scaled(const Image& small, int32_t k) {
   return big;
 }
 
-void draw_legend(Image& img, int32_t x, int32_t y) {
+void draw_legend(Image& img, int32_t x, int32_t y, bool references) {
   const struct {
     uint32_t colour;
     const char* text;
@@ -129,6 +134,7 @@ void draw_legend(Image& img, int32_t x, int32_t y) {
                {kNoGoal, "NO GOAL"},
                {kReference, "MEMCPY AND OPENCV"}};
   for (const auto& it : items) {
+    if (it.colour == kReference && !references) continue;
     fill(img, x, y, 7, 7, it.colour);
     fxtool::draw_text(img, x + 10, y, it.text, kInk);
     x += 10 + text_width(it.text) + 14;
@@ -144,15 +150,17 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "usage: photofx_chart BARS OUT.png\n");
     return 2;
   }
-  std::string title;
+  std::string title, unit = "X";
   std::vector<Panel> panels;
-  if (!read_bars(argv[1], title, panels) || panels.empty()) return 1;
+  if (!read_bars(argv[1], title, unit, panels) || panels.empty()) return 1;
+  bool references = false;
 
   Axis axis;
   size_t rows = 0, label_chars = 0;
   for (const Panel& p : panels) {
     rows = std::max(rows, p.bars.size());
     for (const Bar& b : p.bars) {
+      references = references || b.kind == "reference";
       label_chars = std::max(label_chars, b.label.size());
       for (double v : {b.value, b.goal}) {
         if (v <= 0) continue;
@@ -183,7 +191,7 @@ int main(int argc, char** argv) {
       const double v = std::pow(10.0, d);
       const int32_t x = axis.at(v);
       fill(img, x, plot_top, 1, plot_height, d == 0 ? kFloorLine : kGrid);
-      const std::string t = multiple(v);
+      const std::string t = multiple(v, unit);
       fxtool::draw_text(img, x - text_width(t) / 2, kMargin + 26, t, kInk);
     }
     for (size_t i = 0; i < panels[p].bars.size(); ++i) {
@@ -193,10 +201,10 @@ int main(int argc, char** argv) {
       const int32_t end = axis.at(b.value);
       fill(img, axis.x0, y, end - axis.x0 + 1, kBarHeight, colour_of(b.kind));
       if (b.goal > 0) fill(img, axis.at(b.goal), y - 1, 1, kBarHeight + 2, kInk);
-      fxtool::draw_text(img, axis.x0 + kPlotWidth + 6, y, multiple(b.value), kInk);
+      fxtool::draw_text(img, axis.x0 + kPlotWidth + 6, y, multiple(b.value, unit), kInk);
     }
   }
-  draw_legend(img, kMargin, height - 14);
+  draw_legend(img, kMargin, height - 14, references);
 
   const std::string why = fxtool::write_image(argv[2], scaled(img, kScale));
   if (!why.empty()) {

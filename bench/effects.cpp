@@ -191,11 +191,11 @@ constexpr Effect kEffects[] = {
      .full = row<at("applySoftglow")>, .partial = row<at("applySoftglowPartial")>},
 
     // ---- Film looks ------------------------------------------------------------------------
-    {.name = "vignette", .full = row<at("fx_apply_vignette")>},
+    {.name = "vignette", .goal = kVignetteGoal, .full = row<at("fx_apply_vignette")>},
     {.name = "vignette-preview", .full = row<at("fx_apply_vignette_prev")>},
-    {.name = "vintage", .full = row<at("applyVintage")>, .partial = row<at("applyVintagePartial")>},
+    {.name = "vintage", .goal = kVintageGoal, .full = row<at("applyVintage")>, .partial = row<at("applyVintagePartial")>},
     {.name = "vintage-preview", .full = row<at("fx_apply_vintage_prev")>},
-    {.name = "old-photo", .full = row<at("applyOldPhoto")>, .partial = row<at("applyOldPhotoPartial")>},
+    {.name = "old-photo", .goal = kOldPhotoGoal, .full = row<at("applyOldPhoto")>, .partial = row<at("applyOldPhotoPartial")>},
     {.name = "old-photo-texture", .full = row<at("fx_apply_oldphoto_texture")>,
      .partial = row<at("fx_apply_oldphoto_texture_partial")>},
     {.name = "pop-art", .full = row<at("applyPopArt")>},
@@ -215,7 +215,7 @@ constexpr Effect kEffects[] = {
     {.name = "auto-adjust", .goal = kAutoGoal, .full = row<at("applyAutoAdjust")>},
 
     // ---- Neighbourhood effects -------------------------------------------------------------
-    {.name = "sharpen", .full = row<at("fx_apply_sharpen_all")>, .partial = row<at("applySharpen")>},
+    {.name = "sharpen", .goal = kSharpenGoal, .full = row<at("fx_apply_sharpen_all")>, .partial = row<at("applySharpen")>},
     {.name = "pixelize", .full = row<at("applyPixelize")>},
 
     // ---- Depth-of-field blur: the preview a slider runs, its parts, the one-shot call ------

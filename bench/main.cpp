@@ -15,7 +15,6 @@
 #include <benchmark/benchmark.h>
 #include <dirent.h>
 
-#include <algorithm>
 #include <cstdio>
 #include <cstring>
 #include <memory>
@@ -27,38 +26,13 @@
 #include <opencv2/imgproc.hpp>
 
 #include "bench/alloc_count.h"
+#include "bench/scene.h"
 #include "bench/suite.h"
 #include "photofx.h"
 #include "tools/image.h"
 
 namespace fxbench {
 namespace {
-
-// One image size with its buffers, shared by every benchmark of that size.
-struct Scene {
-  const char* name;
-  int32_t width, height;
-  std::vector<uint32_t> src, dst;
-  std::vector<uint8_t> mask, bgr;
-  int32_t left = 0, right = -1, top = 0, bottom = -1;  // the ellipse's box
-
-  Frame frame(bool masked) {
-    Frame f;
-    f.width = width;
-    f.height = height;
-    f.src = src.data();
-    f.dst = dst.data();
-    f.mask = mask.data();
-    f.bgr = bgr.data();
-    if (masked) {
-      f.left = left;
-      f.right = right;
-      f.top = top;
-      f.bottom = bottom;
-    }
-    return f;
-  }
-};
 
 // The photograph cropped to the scene's shape and scaled to its size.
 void fill_photo(const fxtool::Image& photo, Scene& s) {
@@ -74,28 +48,6 @@ void fill_photo(const fxtool::Image& photo, Scene& s) {
   cv::resize(in(crop), out, out.size(), 0, 0, cv::INTER_CUBIC);
 }
 
-// A centred ellipse with semi-axes 0.651 of the half sides: pi / 4 x 0.651^2 = a third of the
-// pixels, about what a user circles around a subject.
-void fill_mask(Scene& s) {
-  const double cx = (s.width - 1) / 2.0, cy = (s.height - 1) / 2.0;
-  const double a = 0.651 * s.width / 2, b = 0.651 * s.height / 2;
-  s.left = s.width;
-  s.top = s.height;
-  for (int32_t y = 0; y < s.height; ++y) {
-    for (int32_t x = 0; x < s.width; ++x) {
-      const double u = (x - cx) / a, v = (y - cy) / b;
-      const bool in = u * u + v * v <= 1;
-      s.mask[static_cast<size_t>(y) * s.width + x] = in ? 1 : 0;
-      if (in) {
-        s.left = std::min(s.left, x);
-        s.right = std::max(s.right, x);
-        s.top = std::min(s.top, y);
-        s.bottom = std::max(s.bottom, y);
-      }
-    }
-  }
-}
-
 std::unique_ptr<Scene> make_scene(const fxtool::Image& photo, const char* name, int32_t width,
                                   int32_t height) {
   auto s = std::make_unique<Scene>();
@@ -105,10 +57,9 @@ std::unique_ptr<Scene> make_scene(const fxtool::Image& photo, const char* name, 
   const size_t n = static_cast<size_t>(width) * static_cast<size_t>(height);
   s->src.resize(n);
   s->dst.resize(n);
-  s->mask.resize(n);
   s->bgr.resize(n * 3);
   fill_photo(photo, *s);
-  fill_mask(*s);
+  fill_ellipse_mask(*s);
   cv::Mat bgr(height, width, CV_8UC3, s->bgr.data());
   cv::cvtColor(cv::Mat(height, width, CV_8UC4, s->src.data()), bgr, cv::COLOR_BGRA2BGR);
   return s;

@@ -90,6 +90,21 @@ class Goals(unittest.TestCase):
         self.assertAlmostEqual(rows["fat/full/12mp"].bytes_per_px, 9.0)
         self.assertIs(rows["fat/full/12mp"].met, False)
 
+    def test_partial_variant_is_held_to_one_and_a_half_times_its_full_variant(self):
+        rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
+                        bench("look/full/12mp", 40, "goal=memcpy*6"),
+                        bench("look/partial/12mp", 70, ""),
+                        bench("tone/full/12mp", 40, ""),
+                        bench("tone/partial/12mp", 50, ""),
+                        bench("tone/full/preview", 1, "", px=777600),
+                        bench("tone/partial/preview", 9, "", px=777600)])
+        self.assertAlmostEqual(rows["look/partial/12mp"].x_full, 1.75)
+        self.assertIs(rows["look/partial/12mp"].met, False)
+        self.assertIs(rows["tone/partial/12mp"].met, True)
+        self.assertEqual(rows["tone/partial/12mp"].goal_text, "≤ 1.5× full")
+        self.assertIsNone(rows["tone/partial/preview"].met)
+        self.assertIn("1.75× full", report.summary(list(rows.values())))
+
     def test_summary_says_which_part_of_a_two_part_goal_fails(self):
         rows = rows_of([bench("floor/memcpy/12mp", 10, "reference"),
                         bench("slow/full/12mp", 50, "goal=memcpy*4 scratch<=8", peak=8 * 12e6)])
@@ -169,8 +184,29 @@ class Results(unittest.TestCase):
         self.assertEqual(bars[:2], ["title\tT", "panel\t" + report.SIZES["12mp"]])
         self.assertEqual(bars[2:], ["bar\tmemcpy\t1\t0\treference",
                                     "bar\ta\t1.5\t2\tmet",
-                                    "bar\ta partial\t4\t0\tnone",
+                                    "bar\ta partial\t4\t2.25\tmissed",
                                     "bar\tb\t5\t2\tmissed"])
+
+
+class Arm(unittest.TestCase):
+    @staticmethod
+    def arm(counts):
+        """bench/arm-cost's JSON for one build at 640 x 480, counts per pixel of 100 pixels."""
+        return {"sizes": ["640x480"], "builds": {"armv7": {"640x480": {
+            key: {"insns": n * 100, "items": 100, "unit": "pixel"} for key, n in counts.items()}}}}
+
+    def test_partial_is_held_to_its_full_variant_and_full_never_above_partial(self):
+        arm = self.arm({"hue/full": 70, "hue/partial": 75, "sepia/full": 30,
+                        "sepia/partial": 20, "mirror/full": 9})
+        rows = {r.key: r for r in report.arm_rows(arm)[0]}
+        self.assertEqual((rows["hue/full"].goal["armv7"], rows["hue/full"].met["armv7"]),
+                         (80, True))
+        self.assertEqual((rows["hue/partial"].goal["armv7"], rows["hue/partial"].met["armv7"]),
+                         (74, False))
+        self.assertIsNone(rows["mirror/full"].goal["armv7"])
+        md = report.arm_markdown(arm)
+        self.assertIn("3 of 4 ARM goals met, 1 not met.", md)
+        self.assertIn("more than their partial variant: sepia (armv7: 30.0 against 20.0)", md)
 
 
 @unittest.skipUnless(os.environ.get("PHOTOFX_CHART"), "PHOTOFX_CHART names no chart program")

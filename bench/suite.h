@@ -87,6 +87,10 @@ constexpr Goal kBlurPreviewGoal{Base::kMemcpy, 4.0};  // the whole preview call 
 constexpr Goal kBlurKernelGoal{Base::kPeer, 1.5};     // the Gaussian of the working image
 constexpr Goal kWarpGoal{Base::kPeer, 1.5};           // twirl and sphericity vs remap
 constexpr Goal kAutoGoal{Base::kMemcpy, 4.0, 8.0};    // auto adjust, time and scratch
+constexpr Goal kSharpenGoal{Base::kMemcpy, 4.0};      // a three-tap filter
+constexpr Goal kVignetteGoal{Base::kMemcpy, 3.0};     // one weight per pixel
+constexpr Goal kVintageGoal{Base::kMemcpy, 6.0};      // the vintage look's full variant
+constexpr Goal kOldPhotoGoal{Base::kMemcpy, 4.0};     // the old photo's full variant
 
 // One effect. `full` runs on the frame with empty bounds, `partial` (when the library has a
 // masked variant) on the frame with the ellipse's bounds; each becomes a benchmark per size.

@@ -9,6 +9,7 @@
 
 #include <cstddef>
 
+#include "blur/kernels.h"
 #include "blur/workspace.h"
 #include "frame/dispatch.h"
 #include "frame/frame.h"
@@ -65,6 +66,35 @@ void working_spans(int32_t width, int32_t sw, int32_t xscale, int32_t* span_star
   span_start[spans] = width;
 }
 
+namespace {
+
+// The column sums as planes (red, green, blue, own), padded by 8 entries that the NEON rows read
+// past the last working column (and never use).
+struct SumPlanes {
+  uint16_t plane[4][kMaxWorkingSide + 8] = {};
+  uint16_t* const p[4] = {plane[0], plane[1], plane[2], plane[3]};
+};
+
+// composite() through the NEON kernels, where they apply (false: nothing done).
+bool composite_neon(const uint32_t* src, const uint8_t* blur, const uint8_t* mask,
+                    const uint8_t* depth, uint32_t* dst, int32_t width, int32_t height, int32_t sw,
+                    int32_t sh, bool every_pixel, int32_t xscale, int32_t yscale) {
+  // The rows gather each block's sums from eight entries, which needs a working image at most
+  // half the width.
+  if (xscale > 16384) return false;
+  SumPlanes sums;
+  for (int32_t y = 0; y < height; ++y) {
+    const WorkingPos py = working_pos(y, yscale, sh);
+    const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+    neon::column_sums(blur, depth, sw, py.index, py.frac, sums.p);
+    neon::composite_row(src + row, every_pixel ? nullptr : mask + row, dst + row, width, sw, xscale,
+                        sums.p);
+  }
+  return true;
+}
+
+}  // namespace
+
 void column_sums(const uint8_t* blur, const uint8_t* depth, int32_t sw, WorkingPos py,
                  ColumnSum* sums) {
   const size_t row_samples = static_cast<size_t>(sw);
@@ -89,6 +119,10 @@ void composite(const uint32_t* src, const uint8_t* blur, const uint8_t* mask, co
                bool every_pixel) {
   const int32_t yscale = working_scale(sh, height);
   const int32_t xscale = working_scale(sw, width);
+  if (neon_kernels() && composite_neon(src, blur, mask, depth, dst, width, height, sw, sh,
+                                       every_pixel, xscale, yscale)) {
+    return;
+  }
   const int32_t spans = sw - 1;
   int32_t span_start[kMaxWorkingSide];
   ColumnSum sums[kMaxWorkingSide];

@@ -9,6 +9,7 @@
 #include <cstddef>
 
 #include "frame/dispatch.h"
+#include "blur/kernels.h"
 #include "frame/frame.h"
 #include "photofx.h"
 
@@ -30,30 +31,16 @@ constexpr Window window_for(int32_t level) {
   return {-static_cast<int32_t>((l + 1) / 2), static_cast<int32_t>(l / 2)};
 }
 
-constexpr int32_t kTaps = 9;
-
-// The nine taps of one line of outputs: for tap t, output x reads present[t][x] (1 where the tap
-// lies in the image), inside[t][x] (1 where it lies inside the area) and v[c][t][x]. A tap
-// outside the level's window, or beyond the edge, has kernel weight 0 and active 0, and so
-// contributes nothing however its bytes read.
-struct Taps {
-  const uint8_t* present[kTaps];
-  const uint8_t* inside[kTaps];
-  const uint8_t* v[3][kTaps];
-  uint16_t k[kTaps];
-  uint16_t active[kTaps];
-};
-
 // Blurs one line: each tap inside the area adds its kernel weight times its channels, each
 // other tap in the window stands for the centre sample with weight 9, so the weight is 9..81
 // and the result the sum over the weight. All nine taps are summed in registers, and the loop
 // vectorises across the line (the outputs are __restrict, so they cannot move the inputs).
-void blur_line_loop(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
+void blur_line_loop(int32_t from, int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1,
                     const uint8_t* c2, uint8_t* __restrict o0, uint8_t* __restrict o1,
                     uint8_t* __restrict o2) {
   const Taps t = taps;
   PFX_NO_ALIAS_LOOP
-  for (int32_t x = 0; x < n; ++x) {
+  for (int32_t x = from; x < n; ++x) {
     // Every sum fits 16 bits (channels at most 255 x 55, weights at most 55, counts at most
     // 9), and 16-bit lanes hold twice as many outputs per vector.
     uint16_t inside = 0, outside = 0, s0 = 0, s1 = 0, s2 = 0;
@@ -77,9 +64,14 @@ void blur_line_loop(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_
   }
 }
 
+// A line: through the NEON kernel first where the path has one, the rest by the loop's copy of
+// the path in force.
 void blur_line(int32_t n, const Taps& taps, const uint8_t* c0, const uint8_t* c1, const uint8_t* c2,
-               uint8_t* o0, uint8_t* o1, uint8_t* o2) {
-  vector_paths([&] { blur_line_loop(n, taps, c0, c1, c2, o0, o1, o2); });
+               uint8_t* o0, uint8_t* o1, uint8_t* o2, bool clean) {
+  const int32_t done =
+      neon_kernels() ? static_cast<int32_t>(neon::blur_line(n, taps, c0, c1, c2, o0, o1, o2, clean))
+                     : 0;
+  vector_paths([&] { blur_line_loop(done, n, taps, c0, c1, c2, o0, o1, o2); });
 }
 
 // Splits a row of red, green, blue samples into three channel rows, and joins them back.
@@ -142,6 +134,17 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
   for (size_t i = 0; i < samples; ++i) {
     flags[i] = (depth == nullptr || depth[i] == 1) ? 1 : 0;
   }
+  // Rows whose every sample is inside the area, for the vector kernels' shortcut (heights of
+  // working images stay within 2048; taller ones simply go without it).
+  constexpr int32_t kMaxRows = 2048;
+  bool full_row[kMaxRows] = {};
+  const bool rows_known = height <= kMaxRows && neon_kernels();
+  for (int32_t y = 0; rows_known && y < height; ++y) {
+    const uint8_t* f = flags + static_cast<size_t>(y) * w;
+    uint8_t all = 1;
+    for (size_t x = 0; x < w; ++x) all &= f[x];  // flags are 0 or 1
+    full_row[y] = all != 0;
+  }
 
   const Window win = window_for(level);
   Taps taps{};
@@ -162,13 +165,14 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
     for (size_t x = 0; x < w; ++x) inside[kPad + x] = flags[row + x];
     split_row(in, width, value[0] + kPad, value[1] + kPad, value[2] + kPad);
     blur_line(width, taps, value[0] + kPad, value[1] + kPad, value[2] + kPad, plane[0] + row,
-              plane[1] + row, plane[2] + row);
+              plane[1] + row, plane[2] + row, rows_known && full_row[y]);
   }
 
   // Vertical pass, from the planes into dst, a row of outputs at a time. Rows beyond the edge
   // drop out whole; they are pointed at the centre row only to keep every read in bounds.
   const uint8_t* every = present + kPad;
   for (int32_t y = 0; y < height; ++y) {
+    bool clean = rows_known;
     for (int32_t i = 0; i < kTaps; ++i) {
       const int32_t o = i - kPad;
       const bool used = o >= win.lo && o <= win.hi && y + o >= 0 && y + o < height;
@@ -178,10 +182,11 @@ bool gaussian_blur(const uint8_t* src, uint8_t* dst, const uint8_t* depth, int32
       for (int c = 0; c < 3; ++c) taps.v[c][i] = plane[c] + row;
       taps.k[i] = static_cast<uint16_t>(used ? kBlurKernel[o < 0 ? -o : o] : 0);
       taps.active[i] = used ? 1 : 0;
+      if (used && clean) clean = full_row[y + o];
     }
     const size_t row = static_cast<size_t>(y) * w;
     blur_line(width, taps, plane[0] + row, plane[1] + row, plane[2] + row, value[0], value[1],
-              value[2]);
+              value[2], clean);
     join_row(value[0], value[1], value[2], width, dst + 3 * row);
   }
   fx_free(block);

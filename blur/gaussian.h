@@ -28,6 +28,19 @@ inline constexpr uint32_t kBlurReciprocal[82] = {PFX_TABLE_64(blur_reciprocal, 0
                                                  PFX_TABLE_16(blur_reciprocal, 64u),
                                                  PFX_TABLE_2(blur_reciprocal, 80u)};
 
+// The nine taps of one line of outputs: for tap t, output x reads present[t][x] (1 where the tap
+// lies in the image), inside[t][x] (1 where it lies inside the area) and v[c][t][x]. A tap
+// outside the level's window, or beyond the edge, has kernel weight 0 and active 0, and so
+// contributes nothing however its bytes read.
+constexpr int32_t kTaps = 9;
+struct Taps {
+  const uint8_t* present[kTaps];
+  const uint8_t* inside[kTaps];
+  const uint8_t* v[3][kTaps];
+  uint16_t k[kTaps];
+  uint16_t active[kTaps];
+};
+
 // Blurs a width x height working image from src into dst (which may be src). Taps whose depth
 // byte is not 1 stand in for the centre sample; a null depth map counts every tap as inside the
 // area. Returns false, with dst untouched, when the scratch image cannot be allocated or the

@@ -11,6 +11,7 @@
 
 #include "blur/composite.h"
 #include "blur/gaussian.h"
+#include "blur/kernels.h"
 #include "blur/lens.h"
 #include "blur/workspace.h"
 #include "frame/dispatch.h"
@@ -69,6 +70,24 @@ void restore(const uint32_t* src, const uint8_t* blur, uint32_t* dst, int32_t wi
   }
   const int32_t yscale = working_scale(sh, height);
   const int32_t xscale = working_scale(sw, width);
+  // On the NEON path, with a working image at most half the width, rows go through the
+  // kernels (blur/blur_neon.cpp), sharp rows as plain copies.
+  if (neon_kernels() && xscale <= 16384) {
+    uint16_t planes[3][kMaxWorkingSide + 8] = {};
+    uint16_t* const p[3] = {planes[0], planes[1], planes[2]};
+    for (int32_t y = 0; y < height; ++y) {
+      const size_t row = static_cast<size_t>(y) * static_cast<size_t>(width);
+      const int32_t w = band.weight(y);
+      if (w == 256) {
+        copy_run(src, dst, row, row + static_cast<size_t>(width));
+        continue;
+      }
+      const WorkingPos py = working_pos(y, yscale, sh);
+      neon::column_sums(blur, nullptr, sw, py.index, py.frac, p);
+      neon::restore_row(src + row, dst + row, width, sw, xscale, w, p);
+    }
+    return;
+  }
   int32_t span_start[kMaxWorkingSide];
   ColumnSum sums[kMaxWorkingSide];
   working_spans(width, sw, xscale, span_start);

@@ -12,6 +12,7 @@
 #include <cstdint>
 
 #include "frame/dispatch.h"
+#include "frame/kernel.h"
 #include "photofx.h"
 
 namespace pfx {
@@ -97,14 +98,16 @@ inline void copy_run(const uint32_t* src, uint32_t* dst, size_t begin, size_t en
 }
 
 // Full variant: dst[i] = rule(src[i]) for every pixel in row order. Each output reads only its
-// own source pixel, so src and dst may be the same buffer.
-template <class Rule>
+// own source pixel, so src and dst may be the same buffer. A vector kernel of the rule
+// (frame/kernel.h), where the build has one, does what it can first.
+template <class Rule, class Kernel = NoKernel>
 inline bool for_each_pixel(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
-                           Rule&& rule) {
+                           Rule&& rule, Kernel&& kernel = {}) {
   if (src == nullptr || dst == nullptr) return false;
   const int64_t n = pixel_count(width, height);
   if (n > kMaxPixels) return false;
-  map_pixels(src, dst, static_cast<size_t>(n), rule);
+  const size_t done = neon_kernels() ? kernel(Run{src, nullptr, dst, static_cast<size_t>(n)}) : 0;
+  map_pixels(src + done, dst + done, static_cast<size_t>(n) - done, rule);
   return true;
 }
 
@@ -142,6 +145,25 @@ inline void for_each_selected(const uint8_t* mask, int32_t width, int32_t height
   }
 }
 
+// The masked mode of a partial frame within the clipped, non-empty rectangle r: in each row
+// the pixels whose mask byte is 1 get rule(src), the others src, through the kernel first where
+// the path has one; around(row) handles the rest of each row.
+template <class Rule, class Kernel, class Around>
+inline void edit_rows(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                      const Rect& r, const Rule& rule, const Kernel& kernel, const Around& around) {
+  const bool vector = neon_kernels();
+  const size_t w = static_cast<size_t>(width);
+  const size_t left = static_cast<size_t>(r.left),
+               count = static_cast<size_t>(r.right - r.left) + 1;
+  for (int32_t y = r.top; y <= r.bottom; ++y) {
+    const size_t row = static_cast<size_t>(y) * w;
+    around(row);
+    const size_t at = row + left;
+    const size_t done = vector ? kernel(Run{src + at, mask + at, dst + at, count}) : 0;
+    map_selected_pixels(src + at + done, mask + at + done, dst + at + done, count - done, rule);
+  }
+}
+
 // Checks shared by the partial variants: both pixel buffers present, a mask present whenever
 // the bounds select masked mode, and an image small enough to address.
 inline bool partial_args_ok(const uint32_t* src, const uint8_t* mask, const uint32_t* dst,
@@ -157,13 +179,14 @@ inline bool partial_args_ok(const uint32_t* src, const uint8_t* mask, const uint
 // The copy and the edit are made in one pass, each destination pixel written once: since the
 // rule reads only the source, a pixel that is copied and then edited ends up the same as one
 // that is edited straight away. Whole-image mode edits every pixel, so nothing needs copying.
-template <class Rule>
+template <class Rule, class Kernel = NoKernel>
 inline bool edit_selected(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
-                          int32_t height, Rect bounds, Rule&& rule) {
+                          int32_t height, Rect bounds, Rule&& rule, Kernel&& kernel = {}) {
   if (!partial_args_ok(src, mask, dst, width, height, bounds)) return false;
   const size_t n = static_cast<size_t>(pixel_count(width, height));
   if (!is_region(bounds)) {
-    map_pixels(src, dst, n, rule);
+    const size_t done = neon_kernels() ? kernel(Run{src, nullptr, dst, n}) : 0;
+    map_pixels(src + done, dst + done, n - done, rule);
     return true;
   }
   const Rect r = clip_to_image(bounds, width, height);
@@ -174,13 +197,10 @@ inline bool edit_selected(const uint32_t* src, const uint8_t* mask, uint32_t* ds
   const size_t w = static_cast<size_t>(width);
   const size_t left = static_cast<size_t>(r.left), right = static_cast<size_t>(r.right);
   copy_run(src, dst, 0, static_cast<size_t>(r.top) * w);
-  for (int32_t y = r.top; y <= r.bottom; ++y) {
-    const size_t row = static_cast<size_t>(y) * w;
+  edit_rows(src, mask, dst, width, r, rule, kernel, [&](size_t row) {
     copy_run(src, dst, row, row + left);
-    map_selected_pixels(src + row + left, mask + row + left, dst + row + left, right - left + 1,
-                        rule);
     copy_run(src, dst, row + right + 1, row + w);
-  }
+  });
   copy_run(src, dst, (static_cast<size_t>(r.bottom) + 1) * w, n);
   return true;
 }

@@ -12,28 +12,11 @@
 #include "frame/frame.h"
 #include "frame/pixel.h"
 #include "frame/table.h"
+#include "looks/kernels.h"
 #include "photofx.h"
 
 namespace pfx {
 namespace {
-
-// Red offset for v in 0..255: rises by one every four values to 32 at 127..128 and falls back
-// to 0. Three values sit one step off the plain quarter; they are part of the curve, and images
-// tinted with it depend on them. Written as selects rather than branches so that it vectorises.
-constexpr int32_t sepia_red_offset(int32_t v) {
-  const int32_t quarter = v <= 128 ? (v + 1) >> 2 : (256 - v) >> 2;
-  return quarter - (v == 43 ? 1 : 0) + (v == 133 || v == 137 ? 1 : 0);
-}
-
-// Blue offset for v in 0..255: a run of 0 at each end and a peak of 31 over 125..130.
-constexpr int32_t sepia_blue_offset(int32_t v) {
-  const int32_t quarter = v <= 128 ? (v - 1) >> 2 : (254 - v) >> 2;
-  return quarter < 0 ? 0 : quarter;
-}
-
-// The curves for any int: values outside 0..255 pass unchanged.
-constexpr int32_t sepia_red(int32_t v) { return v < 0 || v > 255 ? v : v + sepia_red_offset(v); }
-constexpr int32_t sepia_blue(int32_t v) { return v < 0 || v > 255 ? v : v - sepia_blue_offset(v); }
 
 constexpr uint8_t sepia_red_entry(int32_t v) { return static_cast<uint8_t>(sepia_red(v)); }
 constexpr uint8_t sepia_blue_entry(int32_t v) { return static_cast<uint8_t>(sepia_blue(v)); }
@@ -95,14 +78,16 @@ void fx_control_greyscale(const uint32_t* src, const uint8_t* mask, uint32_t* ds
 }
 
 int32_t fx_apply_sepia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  return pfx::sepia_status(pfx::for_each_pixel(src, dst, width, height, pfx::sepia_rule));
+  return pfx::sepia_status(
+      pfx::for_each_pixel(src, dst, width, height, pfx::sepia_rule, pfx::neon::sepia));
 }
 
 int32_t fx_apply_sepia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                int32_t width, int32_t height, int32_t left, int32_t right,
                                int32_t top, int32_t bottom) {
   return pfx::sepia_status(pfx::edit_selected(src, mask, dst, width, height,
-                                              {left, right, top, bottom}, pfx::sepia_rule));
+                                              {left, right, top, bottom}, pfx::sepia_rule,
+                                              pfx::neon::sepia));
 }
 
 int32_t fx_get_sepia_r(int32_t value) { return pfx::sepia_red(value); }

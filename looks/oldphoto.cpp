@@ -15,19 +15,9 @@
 #include "frame/pixel.h"
 #include "frame/table.h"
 #include "looks/greyscale_sepia.h"
+#include "looks/oldphoto.h"
 #include "looks/vignette.h"
 #include "photofx.h"
-
-namespace pfx {
-namespace {
-
-// (v - 128) / 10 rounded away from zero: -13 at 0, 0 at 128 alone, 13 at 255.
-constexpr int32_t oldphoto_entry(int32_t v) {
-  return v < 128 ? -((128 - v + 9) / 10) : (v - 128 + 9) / 10;
-}
-
-}  // namespace
-}  // namespace pfx
 
 extern "C" {
 
@@ -38,14 +28,11 @@ constinit const int32_t LUT_OLDPHOTO[256] = {PFX_TABLE_256(pfx::oldphoto_entry, 
 namespace pfx {
 namespace {
 
-// Twice the step toward 128 never overshoots it: 0 becomes 26 and 255 becomes 229.
-int32_t flatten(int32_t c) { return clamp_byte(c - 2 * LUT_OLDPHOTO[c]); }
-
-uint32_t oldphoto_pixel(uint32_t p, int32_t weight) {
-  const int32_t r = flatten(kSepiaRed[red_of(p)]);
-  const int32_t g = flatten(green_of(p));
-  const int32_t b = flatten(kSepiaBlue[blue_of(p)]);
-  return pack(p, (weight * r) >> 22, (weight * g) >> 22, (weight * b) >> 22);
+uint32_t oldphoto_pixel(uint32_t p, uint32_t w) {
+  const auto& t = kOldPhotoCurves.t;
+  const int32_t weight = static_cast<int32_t>(w);
+  return pack(p, (weight * t[0][red_of(p)]) >> 22, (weight * t[1][green_of(p)]) >> 22,
+              (weight * t[2][blue_of(p)]) >> 22);
 }
 
 // Hue of the textured look's tone, in degrees.
@@ -85,10 +72,7 @@ class TexturedLook {
 extern "C" {
 
 void fx_apply_oldphoto(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  const pfx::PreviewVignette vignette(width, height);
-  pfx::for_each_pixel_at(src, dst, width, height, [&](uint32_t p, int32_t x, int32_t y) {
-    return pfx::oldphoto_pixel(p, vignette.weight(x, y));
-  });
+  fx_apply_oldphoto_partial(src, nullptr, dst, width, height, 1, 0, 0, 0);
 }
 
 // Every pixel is decided from its own source word before its destination word is written, so
@@ -98,16 +82,12 @@ void fx_apply_oldphoto_partial(const uint32_t* src, const uint8_t* mask, uint32_
                                int32_t top, int32_t bottom) {
   const pfx::Rect bounds{left, right, top, bottom};
   if (!pfx::partial_args_ok(src, mask, dst, width, height, bounds)) return;
-  if (!pfx::is_region(bounds)) {
-    fx_apply_oldphoto(src, dst, width, height);
-    return;
-  }
   const pfx::PreviewVignette vignette(width, height);
-  const size_t w = static_cast<size_t>(width);
-  pfx::for_each_pixel_at(src, dst, width, height, [&](uint32_t p, int32_t x, int32_t y) {
-    const size_t i = static_cast<size_t>(y) * w + static_cast<size_t>(x);
-    return mask[i] == 1 ? pfx::oldphoto_pixel(p, vignette.weight(x, y)) : p;
-  });
+  pfx::for_each_pixel_weighted(src, pfx::is_region(bounds) ? mask : nullptr, dst, width, height,
+                               vignette, pfx::oldphoto_pixel,
+                               [&](const pfx::Run& run, int32_t x0, uint32_t base) {
+                                 return pfx::neon::oldphoto(run, vignette, x0, base);
+                               });
 }
 
 void fx_apply_oldphoto_texture(const uint32_t* src, uint32_t* dst, const uint32_t* texture,

@@ -20,4 +20,21 @@ using FullLook = void (*)(const uint32_t* src, uint32_t* dst, int32_t width, int
 void composite_preset(FullLook look, const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                       int32_t width, int32_t height, Rect bounds);
 
+// The same pixels for a look that is one rule per pixel (the fused chains), made without the
+// scratch image: only the pixels inside the bounds are worked out, the selected ones through
+// the rule (and its vector kernel where the path has one), and nothing can fail for want of
+// memory.
+template <class Rule, class Kernel>
+void composite_pixels(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
+                      int32_t height, Rect bounds, const Rule& rule, const Kernel& kernel) {
+  if (!partial_args_ok(src, mask, dst, width, height, bounds)) return;
+  if (!is_region(bounds)) {
+    for_each_pixel(src, dst, width, height, rule, kernel);
+    return;
+  }
+  const Rect r = clip_to_image(bounds, width, height);
+  if (r.left > r.right || r.top > r.bottom) return;
+  edit_rows(src, mask, dst, width, r, rule, kernel, [](size_t) {});
+}
+
 }  // namespace pfx

@@ -11,7 +11,8 @@
 // next in registers, which gives the same pixels as one full-image pass per adjustment (none of
 // the fixed levels is refused) at the memory cost of one.
 //
-// The partial variants share preset compositing (looks/preset.h).
+// The partial variants share preset compositing (looks/preset.h); those of the looks that are
+// one rule per pixel make it without a scratch image.
 #include <cstdint>
 
 #include "adjust/brightness_contrast.h"
@@ -21,6 +22,7 @@
 #include "adjust/saturation_temperature.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
+#include "looks/kernels.h"
 #include "looks/preset.h"
 #include "photofx.h"
 
@@ -33,24 +35,50 @@ bool chain_args_ok(const uint32_t* src, const uint32_t* dst, int32_t width, int3
   return src != nullptr && dst != nullptr && pixel_count(width, height) <= kMaxPixels;
 }
 
+// The looks' passes as one rule per pixel, each with its NEON kernel (looks/preset_neon.cpp).
+auto retro() {
+  // Seven rules: left to itself GCC calls the chain per pixel rather than inline it.
+  const Saturation s5(5), s7(7);
+  const Brightness b12(12), b11(11);
+  const Fade fade(50);
+  const Contrast c9(9), c12(12);
+  return [=](uint32_t p) __attribute__((always_inline)) {
+    return pack(p, c12(b11(c9(s7(fade(b12(s5(channels_of(p)))))))));
+  };
+}
+auto sunshine() { return on_pixels(Contrast(11), Temperature(14), Gains(11, 12, 8), Contrast(11)); }
+auto bluewash() {
+  return on_pixels(Contrast(12), Saturation(7), Temperature(6), Exposure(11), Gains(10, 9, 11));
+}
+auto nostalgia() {
+  return on_pixels(Brightness(12), Fade(50), Exposure(11), Saturation(7), Temperature(13));
+}
+auto yellowglow() {
+  return on_pixels(Fade(50), Temperature(12), Exposure(13), Saturation(8), Gains(13, 14, 9),
+                   Contrast(13));
+}
+// Downlight's passes after auto adjust.
+auto downlight_tail() {
+  return on_pixels(Contrast(9), Saturation(7), Gains(9, 9, 9), Exposure(13));
+}
+
+template <class Rule, class Kernel>
+void full_look(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height, const Rule& rule,
+               const Kernel& kernel) {
+  if (chain_args_ok(src, dst, width, height)) for_each_pixel(src, dst, width, height, rule, kernel);
+}
+
 }  // namespace
 }  // namespace pfx
 
 extern "C" {
 
 void fx_apply_retro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  pfx::for_each_pixel(
-      src, dst, width, height,
-      pfx::on_pixels(pfx::Saturation(5), pfx::Brightness(12), pfx::Fade(50), pfx::Saturation(7),
-                     pfx::Contrast(9), pfx::Brightness(11), pfx::Contrast(12)));
+  pfx::full_look(src, dst, width, height, pfx::retro(), pfx::neon::retro);
 }
 
 void fx_apply_sunshine(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  pfx::for_each_pixel(src, dst, width, height,
-                      pfx::on_pixels(pfx::Contrast(11), pfx::Temperature(14), pfx::Gains(11, 12, 8),
-                                     pfx::Contrast(11)));
+  pfx::full_look(src, dst, width, height, pfx::sunshine(), pfx::neon::sunshine);
 }
 
 // Auto adjust looks at the whole image, so the chain is made in three parts: the faded pass,
@@ -59,43 +87,35 @@ void fx_apply_downlight(const uint32_t* src, uint32_t* dst, int32_t width, int32
   if (!pfx::chain_args_ok(src, dst, width, height)) return;
   fx_control_fadedcolor_all(src, dst, width, height, 50);
   fx_process_hdr(dst, dst, width, height);
-  pfx::for_each_pixel(
-      dst, dst, width, height,
-      pfx::on_pixels(pfx::Contrast(9), pfx::Saturation(7), pfx::Gains(9, 9, 9), pfx::Exposure(13)));
+  pfx::for_each_pixel(dst, dst, width, height, pfx::downlight_tail(), pfx::neon::downlight_tail);
 }
 
 void fx_apply_bluewash(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  pfx::for_each_pixel(src, dst, width, height,
-                      pfx::on_pixels(pfx::Contrast(12), pfx::Saturation(7), pfx::Temperature(6),
-                                     pfx::Exposure(11), pfx::Gains(10, 9, 11)));
+  pfx::full_look(src, dst, width, height, pfx::bluewash(), pfx::neon::bluewash);
 }
 
 void fx_apply_nostalgia(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  pfx::for_each_pixel(src, dst, width, height,
-                      pfx::on_pixels(pfx::Brightness(12), pfx::Fade(50), pfx::Exposure(11),
-                                     pfx::Saturation(7), pfx::Temperature(13)));
+  pfx::full_look(src, dst, width, height, pfx::nostalgia(), pfx::neon::nostalgia);
 }
 
 void fx_apply_yellowglow(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
-  if (!pfx::chain_args_ok(src, dst, width, height)) return;
-  pfx::for_each_pixel(src, dst, width, height,
-                      pfx::on_pixels(pfx::Fade(50), pfx::Temperature(12), pfx::Exposure(13),
-                                     pfx::Saturation(8), pfx::Gains(13, 14, 9), pfx::Contrast(13)));
+  pfx::full_look(src, dst, width, height, pfx::yellowglow(), pfx::neon::yellowglow);
 }
 
+// The partial variants of the looks that are one rule per pixel need no scratch image
+// (looks/preset.h); downlight's depends on the whole image through auto adjust.
 void fx_apply_retro_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst, int32_t width,
                             int32_t height, int32_t left, int32_t right, int32_t top,
                             int32_t bottom) {
-  pfx::composite_preset(fx_apply_retro, src, mask, dst, width, height, {left, right, top, bottom});
+  pfx::composite_pixels(src, mask, dst, width, height, {left, right, top, bottom}, pfx::retro(),
+                        pfx::neon::retro);
 }
 
 void fx_apply_sunshine_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                int32_t width, int32_t height, int32_t left, int32_t right,
                                int32_t top, int32_t bottom) {
-  pfx::composite_preset(fx_apply_sunshine, src, mask, dst, width, height,
-                        {left, right, top, bottom});
+  pfx::composite_pixels(src, mask, dst, width, height, {left, right, top, bottom}, pfx::sunshine(),
+                        pfx::neon::sunshine);
 }
 
 void fx_apply_downlight_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
@@ -108,22 +128,22 @@ void fx_apply_downlight_partial(const uint32_t* src, const uint8_t* mask, uint32
 void fx_apply_bluewash_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                int32_t width, int32_t height, int32_t left, int32_t right,
                                int32_t top, int32_t bottom) {
-  pfx::composite_preset(fx_apply_bluewash, src, mask, dst, width, height,
-                        {left, right, top, bottom});
+  pfx::composite_pixels(src, mask, dst, width, height, {left, right, top, bottom}, pfx::bluewash(),
+                        pfx::neon::bluewash);
 }
 
 void fx_apply_nostalgia_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                 int32_t width, int32_t height, int32_t left, int32_t right,
                                 int32_t top, int32_t bottom) {
-  pfx::composite_preset(fx_apply_nostalgia, src, mask, dst, width, height,
-                        {left, right, top, bottom});
+  pfx::composite_pixels(src, mask, dst, width, height, {left, right, top, bottom}, pfx::nostalgia(),
+                        pfx::neon::nostalgia);
 }
 
 void fx_apply_yellowglow_partial(const uint32_t* src, const uint8_t* mask, uint32_t* dst,
                                  int32_t width, int32_t height, int32_t left, int32_t right,
                                  int32_t top, int32_t bottom) {
-  pfx::composite_preset(fx_apply_yellowglow, src, mask, dst, width, height,
-                        {left, right, top, bottom});
+  pfx::composite_pixels(src, mask, dst, width, height, {left, right, top, bottom},
+                        pfx::yellowglow(), pfx::neon::yellowglow);
 }
 
 void applyRetro(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {

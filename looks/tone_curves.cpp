@@ -9,8 +9,11 @@
 #include <cstdint>
 
 #include "adjust/channel_map.h"
+#include "adjust/kernels.h"
 #include "frame/frame.h"
 #include "frame/pixel.h"
+#include "looks/kernels.h"
+#include "looks/tone_curves.h"
 #include "photofx.h"
 
 namespace pfx {
@@ -41,29 +44,22 @@ auto selected_channels_arithmetic(int32_t channel, Curve curve) {
 }
 
 // Levels within 0 <= low < high <= 255, the range the looks use, keep every product within 32
-// bits and take the arithmetic form, unless the table form is the faster one on this CPU; other
-// levels take the table, made in 64 bits.
+// bits and take the arithmetic form (through the NEON kernel on that path), unless the table
+// form is the faster one on this CPU; other levels take the table, made in 64 bits.
 bool levels_by_arithmetic(int32_t low, int32_t high) {
-  return low >= 0 && low < high && high <= 255 && !channel_map_is_fast();
+  return low >= 0 && low < high && high <= 255 && !channel_map_is_fast() &&
+         (neon_kernels() || !kChannelTablesBeatArithmetic);
 }
 
-// The full-variant frame for the table form.
+// The full-variant frame for the table form, through the NEON table lookups on that path.
 void map_image(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                const ChannelMap& map) {
   if (src == nullptr || dst == nullptr) return;
   const int64_t n = pixel_count(width, height);
   if (n > kMaxPixels) return;
-  map_channels(map, src, dst, static_cast<size_t>(n));
-}
-
-// n / 255 to the power 1 / gamma, scaled back to 0..255 and rounded half up. The clamp is made in
-// double before the conversion, so a gamma of zero, a negative gamma or a NaN (whose products
-// may be infinite or NaN) still gives a byte: NaN reads as 0.
-int32_t gamma_entry(int32_t n, double gamma) {
-  const double t = std::pow(n / 255.0, 1.0 / gamma) * 255.0 + 0.5;
-  if (!(t >= 0.0)) return 0;
-  if (t >= 255.0) return 255;
-  return static_cast<int32_t>(t);
+  const size_t done =
+      neon_kernels() ? neon::kernel(Run{src, nullptr, dst, static_cast<size_t>(n)}, map) : 0;
+  map_channels(map, src + done, dst + done, static_cast<size_t>(n) - done);
 }
 
 }  // namespace
@@ -85,37 +81,33 @@ void control_gamma(const uint32_t* src, uint32_t* dst, int32_t width, int32_t he
 void changeHistogramByInput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                             int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;  // no range to stretch; dst is left as it was
-  const int64_t scale = 261120 / (int64_t{high} - low);
+  const pfx::InputLevels curve(low, high);
   if (pfx::levels_by_arithmetic(low, high)) {
-    const int32_t s32 = static_cast<int32_t>(scale);
-    pfx::for_each_pixel(src, dst, width, height,
-                        pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
-                          return pfx::clamp_byte((s32 * (c - low)) >> 10);
-                        }));
+    const int32_t s32 = static_cast<int32_t>(curve.scale);
+    pfx::for_each_pixel(
+        src, dst, width, height,
+        pfx::selected_channels_arithmetic(
+            channel, [=](int32_t c) { return pfx::clamp_byte((s32 * (c - low)) >> 10); }),
+        [&](const pfx::Run& run) { return pfx::neon::levels(run, channel, true, low, s32); });
     return;
   }
-  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
-                   const int64_t v = (scale * (c - int64_t{low})) >> 10;
-                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                 }));
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, curve));
 }
 
 void changeHistogramByOutput(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height,
                              int32_t channel, int32_t low, int32_t high) {
   if (high <= low) return;
-  const int64_t scale = (int64_t{high} - low) * 1024 / 255;
+  const pfx::OutputLevels curve(low, high);
   if (pfx::levels_by_arithmetic(low, high)) {
-    const int32_t s32 = static_cast<int32_t>(scale);
-    pfx::for_each_pixel(src, dst, width, height,
-                        pfx::selected_channels_arithmetic(channel, [=](int32_t c) {
-                          return pfx::clamp_byte(((s32 * c) >> 10) + low);
-                        }));
+    const int32_t s32 = static_cast<int32_t>(curve.scale);
+    pfx::for_each_pixel(
+        src, dst, width, height,
+        pfx::selected_channels_arithmetic(
+            channel, [=](int32_t c) { return pfx::clamp_byte(((s32 * c) >> 10) + low); }),
+        [&](const pfx::Run& run) { return pfx::neon::levels(run, channel, false, low, s32); });
     return;
   }
-  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, [&](int32_t c) {
-                   const int64_t v = ((scale * c) >> 10) + low;
-                   return static_cast<int32_t>(v < 0 ? 0 : (v > 255 ? 255 : v));
-                 }));
+  pfx::map_image(src, dst, width, height, pfx::selected_channels(channel, curve));
 }
 
 }  // extern "C"

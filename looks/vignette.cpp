@@ -34,31 +34,6 @@ int32_t vignette_entry(int64_t k) {
 
 namespace {
 
-// Weight 1 - (7/16)(dx/hw)^2 - (7/16)(dy/hh)^2 in units of 2^20. The factors 2^28 / hw^2 and
-// 2^28 / hh^2 need both half-sizes to be at least 1; the caller sees to that. Formed in 64 bits:
-// for half-sizes up to 16384 (the only ones with a non-zero factor) the products fit 32 bits and
-// the values are the same.
-class DividedVignette {
- public:
-  DividedVignette(int32_t width, int32_t height)
-      : hw_(width >> 1),
-        hh_(height >> 1),
-        kx_((int64_t{1} << 28) / (int64_t{hw_} * hw_)),
-        ky_((int64_t{1} << 28) / (int64_t{hh_} * hh_)) {}
-
-  int32_t weight(int32_t x, int32_t y) const {
-    const int64_t w =
-        (int64_t{1} << 28) - term(x - int64_t{hw_}, kx_) - term(y - int64_t{hh_}, ky_);
-    return w < 0 ? 0 : static_cast<int32_t>(w >> 8);
-  }
-
- private:
-  static int64_t term(int64_t d, int64_t k) { return k == 0 ? 0 : (k * (7 * d * d)) >> 4; }
-
-  int32_t hw_, hh_;
-  int64_t kx_, ky_;
-};
-
 // Each colour channel times weight / 2^shift; alpha kept.
 constexpr uint32_t scale_pixel(uint32_t p, int32_t weight, int32_t shift) {
   return pack(p, (weight * red_of(p)) >> shift, (weight * green_of(p)) >> shift,
@@ -77,18 +52,33 @@ void fx_apply_vignette(const uint32_t* src, uint32_t* dst, int32_t width, int32_
     pfx::for_each_pixel(src, dst, width, height, [](uint32_t p) { return p; });
     return;
   }
-  if (pfx::pixel_count(width, height) > pfx::kMaxPixels) return;
+  if (src == nullptr || dst == nullptr || pfx::pixel_count(width, height) > pfx::kMaxPixels) {
+    return;
+  }
   const pfx::DividedVignette vignette(width, height);
-  pfx::for_each_pixel_at(src, dst, width, height, [&](uint32_t p, int32_t x, int32_t y) {
-    return pfx::scale_pixel(p, vignette.weight(x, y), 20);
-  });
+  pfx::for_each_pixel_weighted(
+      src, nullptr, dst, width, height, vignette,
+      [](uint32_t p, uint32_t w) {
+        return pfx::scale_pixel(p, static_cast<int32_t>(w), pfx::DividedVignette::kShift);
+      },
+      [&](const pfx::Run& run, int32_t x0, uint32_t base) {
+        return pfx::neon::vignette(run, vignette, x0, base);
+      });
 }
 
 void fx_apply_vignette_prev(const uint32_t* src, uint32_t* dst, int32_t width, int32_t height) {
+  if (src == nullptr || dst == nullptr || pfx::pixel_count(width, height) > pfx::kMaxPixels) {
+    return;
+  }
   const pfx::PreviewVignette vignette(width, height);
-  pfx::for_each_pixel_at(src, dst, width, height, [&](uint32_t p, int32_t x, int32_t y) {
-    return pfx::scale_pixel(p, vignette.weight(x, y), 22);
-  });
+  pfx::for_each_pixel_weighted(
+      src, nullptr, dst, width, height, vignette,
+      [](uint32_t p, uint32_t w) {
+        return pfx::scale_pixel(p, static_cast<int32_t>(w), pfx::PreviewVignette::kShift);
+      },
+      [&](const pfx::Run& run, int32_t x0, uint32_t base) {
+        return pfx::neon::vignette_preview(run, vignette, x0, base);
+      });
 }
 
 }  // extern "C"

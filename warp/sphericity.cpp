@@ -115,19 +115,15 @@ struct Sphericity {
 // Pinch: k < 2^19 and |dx| < 2^13 make k dx a 33-bit product, but only k dx >> 7 is needed
 // (its whole pixels from bit 11 up, its weight below): with k = 128 kh + kl that is
 // kh dx + (kl dx >> 7), exactly, in 32 bits.
-struct SphereRun {
-  int32_t width, height, cx, cy;
-  uint32_t inv_rim;  // 2^30 / rim
-  bool pinch;
-  uint32_t den[257], recip[257];  // bulge: den and 2^37 / den for each t
-  int32_t k_hi[257], k_lo[257];   // pinch: k >> 7 and k & 127 for each t
-};
 
-// Warped values of the pixels at column offsets dx0 + step * i (i < n) from the centre on the
-// row dy below it.
-void sphericity_run_loop(const SphereRun& run, const uint32_t* __restrict src, int32_t dy,
-                         int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
-  const int32_t width = run.width, height = run.height, cx = run.cx, cy = run.cy;
+// The source point of each pixel at column offsets dx0 + step * i (i < n) on the row dy below
+// the centre, handed to point(i, sx, sy, fx, fy). Always inlined, so that the x86-64 copies of
+// the run vectorise it with the blend.
+template <class Point>
+__attribute__((always_inline)) inline void sphericity_points(const SphereRun& run, int32_t dy,
+                                                             int32_t dx0, int32_t step, int32_t n,
+                                                             Point&& point) {
+  const int32_t cx = run.cx, cy = run.cy;
   const uint32_t inv_rim = run.inv_rim;
   const uint32_t dy2 = static_cast<uint32_t>(dy * dy);
   if (run.pinch) {
@@ -149,7 +145,7 @@ void sphericity_run_loop(const SphereRun& run, const uint32_t* __restrict src, i
       uint32_t fx = 0, fy = 0;
       axis(cx + dx, dx, kh, kl, sx, fx);
       axis(y, dy, kh, kl, sy, fy);
-      out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
+      point(i, sx, sy, fx, fy);
     }
     return;
   }
@@ -176,8 +172,19 @@ void sphericity_run_loop(const SphereRun& run, const uint32_t* __restrict src, i
     uint32_t fx = 0, fy = 0;
     axis(cx, dx, den, recip, sx, fx);
     axis(cy, dy, den, recip, sy, fy);
-    out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
+    point(i, sx, sy, fx, fy);
   }
+}
+
+// The run's pixels sampled: the points as above, each blended at once, in a loop the compiler
+// vectorises (on x86-64 in the copy of the path in force).
+void sphericity_run_loop(const SphereRun& run, const uint32_t* __restrict src, int32_t dy,
+                         int32_t dx0, int32_t step, int32_t n, uint32_t* __restrict out) {
+  const int32_t width = run.width, height = run.height;
+  sphericity_points(run, dy, dx0, step, n,
+                    [&](int32_t i, int32_t sx, int32_t sy, uint32_t fx, uint32_t fy) {
+                      out[i] = sample_pairs(src, width, height, sx, sy, fx, fy);
+                    });
 }
 
 void sphericity_run(const SphereRun& run, const uint32_t* src, int32_t dy, int32_t dx0,
@@ -222,10 +229,23 @@ int32_t fx_sphericity(const uint32_t* src, uint32_t* dst, int32_t width, int32_t
       run.recip[t] = static_cast<uint32_t>((int64_t{1} << 37) / den);
     }
   }
-  pfx::warp_circle(src, dst, width, height, window, fast != 0, cx, cy, limit,
-                   [&](int32_t y, int32_t x0, int32_t step, int32_t n, uint32_t* out) {
-                     pfx::sphericity_run(run, src, y - cy, x0 - cx, step, n, out);
-                   });
+  pfx::warp_circle(
+      src, dst, width, height, window, fast != 0, cx, cy, limit,
+      [&](int32_t y, int32_t x0, int32_t step, int32_t n, uint32_t* out) {
+        if (!pfx::neon_kernels()) {
+          pfx::sphericity_run(run, src, y - cy, x0 - cx, step, n, out);
+          return;
+        }
+        const int32_t dy = y - cy;
+        pfx::sample_in_chunks(
+            src, width, height, n, out, [&](int32_t at, int32_t m, pfx::PointChunk& chunk) {
+              const int32_t dx0 = x0 - cx + step * at;
+              const int32_t done =
+                  static_cast<int32_t>(pfx::neon::sphericity_points(run, dy, dx0, step, m, chunk));
+              pfx::sphericity_points(run, dy, dx0 + step * done, step, m - done,
+                                     pfx::ChunkSink{chunk, done});
+            });
+      });
   return PHOTOFX_SUCCESS;
 }
 

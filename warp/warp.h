@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "frame/frame.h"
+#include "frame/kernel.h"
 #include "frame/pixel.h"
 #include "photofx.h"
 
@@ -117,6 +118,78 @@ inline uint32_t sample_pairs(const uint32_t* src, int32_t width, int32_t height,
   read_pair(src, static_cast<uint32_t>(ya) * w, sx, width, p00, p10);
   read_pair(src, static_cast<uint32_t>(yb) * w, sx, width, p01, p11);
   return blend_bilinear(fx, fy, p00, p10, p01, p11);
+}
+
+// Source points of a chunk of warped pixels, for the NEON sampler.
+struct PointChunk {
+  static constexpr int32_t kSize = 256;
+  int32_t sx[kSize], sy[kSize];
+  uint16_t fx[kSize], fy[kSize];
+};
+
+// The sphericity's fast path (sphericity.cpp): per row of the table t = (d2 inv_rim) >> 22, the
+// bulge's divisor and reciprocal or the pinch's factor in two parts.
+struct SphereRun {
+  int32_t width, height, cx, cy;
+  uint32_t inv_rim;  // 2^30 / rim
+  bool pinch;
+  uint32_t den[257], recip[257];  // bulge: den and 2^37 / den for each t
+  int32_t k_hi[257], k_lo[257];   // pinch: k >> 7 and k & 127 for each t
+};
+
+// The twirl's fast path (twirl.cpp) for radii up to 4095.
+struct TwirlRun {
+  int32_t width, height, cx, cy;
+  uint32_t radius;  // 1 ... 4095
+  uint32_t inv_rr;  // 2^30 / radius^2
+  uint32_t turn;    // |angle|
+  bool clockwise;
+};
+
+namespace neon {
+// The source points of a twirl run (twirl.cpp's twirl_points), four at a time; returns how
+// many it did.
+PFX_NEON_KERNEL(size_t twirl_points(const TwirlRun&, int32_t, int32_t, int32_t, int32_t,
+                                    PointChunk&))
+
+// The source points of a sphericity run (sphericity.cpp's sphericity_points), four at a time;
+// returns how many it did.
+PFX_NEON_KERNEL(size_t sphericity_points(const SphereRun&, int32_t, int32_t, int32_t, int32_t,
+                                         PointChunk&))
+
+// Samples the first n points of the chunk as sample_pairs does (width >= 2); returns how many
+// it did, a multiple of four.
+PFX_NEON_KERNEL(size_t bilinear(const uint32_t*, int32_t, int32_t, const PointChunk&, size_t,
+                                uint32_t*))
+}  // namespace neon
+
+// A sink for the points functions that stores into a chunk, from index `from` on.
+struct ChunkSink {
+  PointChunk& chunk;
+  int32_t from;
+  void operator()(int32_t i, int32_t sx, int32_t sy, uint32_t fx, uint32_t fy) const {
+    chunk.sx[from + i] = sx;
+    chunk.sy[from + i] = sy;
+    chunk.fx[from + i] = static_cast<uint16_t>(fx);
+    chunk.fy[from + i] = static_cast<uint16_t>(fy);
+  }
+};
+
+// n warped pixels into out, through the NEON sampler in chunks: points(at, m, chunk) fills the
+// chunk with the source points of pixels at .. at + m - 1.
+template <class Points>
+void sample_in_chunks(const uint32_t* src, int32_t width, int32_t height, int32_t n, uint32_t* out,
+                      const Points& points) {
+  PointChunk chunk;
+  for (int32_t at = 0; at < n; at += PointChunk::kSize) {
+    const int32_t m = n - at < PointChunk::kSize ? n - at : PointChunk::kSize;
+    points(at, m, chunk);
+    const size_t done = neon::bilinear(src, width, height, chunk, static_cast<size_t>(m), out + at);
+    for (size_t i = done; i < static_cast<size_t>(m); ++i) {
+      out[at + static_cast<int32_t>(i)] =
+          sample_pairs(src, width, height, chunk.sx[i], chunk.sy[i], chunk.fx[i], chunk.fy[i]);
+    }
+  }
 }
 
 // True when the blocks of na and nb words at a and b share any byte.
