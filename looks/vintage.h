@@ -76,8 +76,15 @@ constexpr ChannelTables vintage_after_brightness() {
   return t;
 }
 
+// clang (the wasm and fuzz builds) does not evaluate pow in constant expressions: there the
+// tables are made when the library is loaded, from the same functions.
+#if defined(__clang__)
+inline const ChannelTables kVintageBefore = vintage_before_brightness();
+inline const ChannelTables kVintageAfter = vintage_after_brightness();
+#else
 inline constexpr ChannelTables kVintageBefore = vintage_before_brightness();
 inline constexpr ChannelTables kVintageAfter = vintage_after_brightness();
+#endif
 
 class VintageLook {
  public:
