@@ -76,8 +76,16 @@ constexpr ChannelTables vintage_after_brightness() {
   return t;
 }
 
-inline constexpr ChannelTables kVintageBefore = vintage_before_brightness();
-inline constexpr ChannelTables kVintageAfter = vintage_after_brightness();
+// GCC folds pow in constant expressions, so there the tables are in the library's data; clang
+// (the WebAssembly build) does not, and makes them once when the library is loaded.
+#if defined(__clang__)
+#define PFX_POW_CONSTEXPR const
+#else
+#define PFX_POW_CONSTEXPR constexpr
+#endif
+inline PFX_POW_CONSTEXPR ChannelTables kVintageBefore = vintage_before_brightness();
+inline PFX_POW_CONSTEXPR ChannelTables kVintageAfter = vintage_after_brightness();
+#undef PFX_POW_CONSTEXPR
 
 class VintageLook {
  public:
