@@ -298,6 +298,21 @@ inline uint32x4_t blend_hi(uint16x8_t a, uint16x8_t b, const Columns& c) {
 
 namespace {
 
+// Eight composited pixels (out: red, green, blue) stored over their source pixels px at dst + x,
+// alpha kept; under a mask only where its byte is non-zero.
+template <bool Masked>
+inline void store_composited(const uint8x8_t (&out)[3], uint8x8x4_t px, const uint8_t* mask,
+                             size_t x, uint32_t* dst) {
+  if constexpr (Masked) {
+    const uint8x8_t m = vld1_u8(mask + x);
+    const uint8x8_t selected = vtst_u8(m, m);
+    for (int32_t k = 0; k < 3; ++k) px.val[2 - k] = vbsl_u8(selected, out[k], px.val[2 - k]);
+  } else {
+    for (int32_t k = 0; k < 3; ++k) px.val[2 - k] = out[k];
+  }
+  vst4_u8(reinterpret_cast<uint8_t*>(dst + x), px);
+}
+
 template <bool Masked>
 void composite_blocks(const uint32_t* src, const uint8_t* mask, uint32_t* dst, uint32_t n,
                       int32_t sw, int32_t xscale, const uint16_t* const* sums) {
@@ -319,15 +334,7 @@ void composite_blocks(const uint32_t* src, const uint8_t* mask, uint32_t* dst, u
       const uint32x4_t hi = vmlal_u16(blend_hi(a, b, c), vget_high_u16(s), vget_high_u16(own));
       out[k] = vmovn_u16(vcombine_u16(vshrn_n_u32(lo, 10), vshrn_n_u32(hi, 10)));
     }
-    if (Masked) {
-      const uint8x8_t m = vld1_u8(mask + x);
-      const uint8x8_t selected = vtst_u8(m, m);
-      for (int32_t k = 0; k < 3; ++k) out[k] = vbsl_u8(selected, out[k], px.val[2 - k]);
-    }
-    px.val[2] = out[0];
-    px.val[1] = out[1];
-    px.val[0] = out[2];
-    vst4_u8(reinterpret_cast<uint8_t*>(dst + x), px);
+    store_composited<Masked>(out, px, mask, x, dst);
   }
 }
 
@@ -395,15 +402,7 @@ uint32_t composite_periodic(const uint32_t* src, const uint8_t* mask, uint32_t* 
       const uint16x8_t t = vmlaq_u16(p.mix(plane[k], j0), vmovl_u8(px.val[2 - k]), own);
       out[k] = vshrn_n_u16(t, K + 5);
     }
-    if (Masked) {
-      const uint8x8_t m = vld1_u8(mask + x);
-      const uint8x8_t selected = vtst_u8(m, m);
-      for (int32_t k = 0; k < 3; ++k) out[k] = vbsl_u8(selected, out[k], px.val[2 - k]);
-    }
-    px.val[2] = out[0];
-    px.val[1] = out[1];
-    px.val[0] = out[2];
-    vst4_u8(reinterpret_cast<uint8_t*>(dst + x), px);
+    store_composited<Masked>(out, px, mask, x, dst);
   }
   return end;
 }

@@ -76,15 +76,16 @@ constexpr ChannelTables vintage_after_brightness() {
   return t;
 }
 
-// clang (the wasm and fuzz builds) does not evaluate pow in constant expressions: there the
-// tables are made when the library is loaded, from the same functions.
+// GCC folds pow in constant expressions, so there the tables are in the library's data; clang
+// (the WebAssembly build) does not, and makes them once when the library is loaded.
 #if defined(__clang__)
-inline const ChannelTables kVintageBefore = vintage_before_brightness();
-inline const ChannelTables kVintageAfter = vintage_after_brightness();
+#define PFX_POW_CONSTEXPR const
 #else
-inline constexpr ChannelTables kVintageBefore = vintage_before_brightness();
-inline constexpr ChannelTables kVintageAfter = vintage_after_brightness();
+#define PFX_POW_CONSTEXPR constexpr
 #endif
+inline PFX_POW_CONSTEXPR ChannelTables kVintageBefore = vintage_before_brightness();
+inline PFX_POW_CONSTEXPR ChannelTables kVintageAfter = vintage_after_brightness();
+#undef PFX_POW_CONSTEXPR
 
 class VintageLook {
  public:
