@@ -156,6 +156,44 @@ std::string circle_warp(const Call& c) {
   return {};
 }
 
+// The blur preview's workspace: the picture and the selection scaled down once, then a blur of
+// the small copy and a compositing pass per level.
+constexpr Stages kBlurPreview{
+    .begin =
+        [](const Call& c) {
+          const Bounds& b = c.bounds;
+          fx_Init_blur(c.src, c.mask, c.width, c.height, b.left, b.right, b.top, b.bottom);
+          return std::string();
+        },
+    .preview =
+        [](const Call& c) {
+          fx_make_blur_preview(c.src, c.mask, c.dst, c.width, c.height, c.arg(0));
+          return std::string();
+        },
+    .end = fx_destroy_blur};
+
+// The tilt-shift preview's workspace: the picture scaled down once, then a band per position.
+constexpr Stages kTiltShiftPreview{.begin =
+                                       [](const Call& c) {
+                                         initTiltShift(c.src, c.width, c.height);
+                                         return std::string();
+                                       },
+                                   .preview =
+                                       [](const Call& c) {
+                                         makeTiltShift(c.src, c.dst, c.width, c.height, c.arg(0),
+                                                       c.arg(1));
+                                         return std::string();
+                                       },
+                                   .end = destroyTiltShift};
+
+template <const Stages& S>
+std::string run_stages(const Call& c) {
+  std::string err = S.begin(c);
+  if (err.empty()) err = S.preview(c);
+  S.end();
+  return err;
+}
+
 // clang-format off
 constexpr Effect kEffects[] = {
     // ---- Tone and colour adjustments --------------------------------------------------------
@@ -288,13 +326,8 @@ constexpr Effect kEffects[] = {
      .state = state_of("fx_Init_blur"),
      .params = {level("fx_make_blur_preview", "level", 4,
                       "blur width: 0..7 use 1..8 taps, 8 the widest (9 taps)")},
-     .run = [](const Call& c) {
-       const Bounds& b = c.bounds;
-       fx_Init_blur(c.src, c.mask, c.width, c.height, b.left, b.right, b.top, b.bottom);
-       fx_make_blur_preview(c.src, c.mask, c.dst, c.width, c.height, c.arg(0));
-       fx_destroy_blur();
-       return std::string();
-     },
+     .run = run_stages<kBlurPreview>,
+     .stages = &kBlurPreview,
      .gallery = "level=4"},
     {.name = "tilt-shift",
      .family = "blur",
@@ -311,12 +344,8 @@ constexpr Effect kEffects[] = {
      .state = state_of("initTiltShift"),
      .params = {row("centre", 500, "the row in the middle of the sharp band"),
                 rows("half-height", 125, "rows kept sharp on each side of the centre")},
-     .run = [](const Call& c) {
-       initTiltShift(c.src, c.width, c.height);
-       makeTiltShift(c.src, c.dst, c.width, c.height, c.arg(0), c.arg(1));
-       destroyTiltShift();
-       return std::string();
-     },
+     .run = run_stages<kTiltShiftPreview>,
+     .stages = &kTiltShiftPreview,
      .gallery = ""},
 
     // ---- Retouching -----------------------------------------------------------------------------
@@ -763,8 +792,12 @@ std::mutex& state_lock(State state) {
 
 }  // namespace
 
-std::string run_effect(const Effect& effect, const Values& values, const uint32_t* src,
-                       int32_t width, int32_t height, uint32_t* dst, const Selection* selection) {
+namespace {
+
+// Checks a call of `effect` and frames it for the run function; dst null: a session's begin,
+// which has no destination yet.
+std::string frame(const Effect& effect, const Values& values, const uint32_t* src, int32_t width,
+                  int32_t height, uint32_t* dst, const Selection* selection, Call& call) {
   if (effect.run == nullptr) return std::string(effect.name) + " has no run function";
   if (selection != nullptr && effect.selects == Selects::kNothing) {
     return std::string(effect.name) + " takes no selection";
@@ -784,37 +817,101 @@ std::string run_effect(const Effect& effect, const Values& values, const uint32_
     return err;
   }
   const bool partial = selection != nullptr && effect.selects == Selects::kMask;
-  // Same-size effects that leave pixels alone start from the source in dst (the brushes edit it
-  // there).
-  const bool leaves_pixels =
-      effect.writes == Writes::kSome || (partial && effect.writes == Writes::kAllWhenWhole);
-  if (effect.size == nullptr && src != dst && leaves_pixels) {
-    std::memcpy(dst, src, n * sizeof(uint32_t));
-  }
   const Bounds whole_image{0, width - 1, 0, height - 1};
-  const Call call{.src = src,
-                  .dst = dst,
-                  .width = width,
-                  .height = height,
-                  .out_width = out_width,
-                  .out_height = out_height,
-                  .mask = partial ? selection->mask.data() : nullptr,
-                  .bounds = partial ? selection->box : Bounds{1, 0, 1, 0},
-                  .window = selection != nullptr ? selection->box : whole_image,
-                  .whole = !partial,
-                  .values = values};
+  call = {.src = src,
+          .dst = dst,
+          .width = width,
+          .height = height,
+          .out_width = out_width,
+          .out_height = out_height,
+          .mask = partial ? selection->mask.data() : nullptr,
+          .bounds = partial ? selection->box : Bounds{1, 0, 1, 0},
+          .window = selection != nullptr ? selection->box : whole_image,
+          .whole = !partial,
+          .values = values};
+  return {};
+}
+
+// Same-size effects that leave pixels alone start from the source in dst (the brushes edit it
+// there).
+void start_from_source(const Effect& effect, const Call& c) {
+  const bool leaves_pixels =
+      effect.writes == Writes::kSome || (!c.whole && effect.writes == Writes::kAllWhenWhole);
+  if (effect.size == nullptr && c.src != c.dst && leaves_pixels) {
+    std::memcpy(c.dst, c.src,
+                static_cast<size_t>(c.width) * static_cast<size_t>(c.height) * sizeof(uint32_t));
+  }
+}
+
+// Effects that edit whole images only get their unselected pixels back from the source.
+void keep_unselected(const Effect& effect, const Selection* selection, const Call& c) {
+  if (selection == nullptr || effect.selects != Selects::kKeep) return;
+  const uint8_t* m = selection->mask.data();
+  for (size_t i = 0; i < selection->mask.size(); ++i) {
+    if (m[i] == 0) c.dst[i] = c.src[i];
+  }
+}
+
+}  // namespace
+
+std::string run_effect(const Effect& effect, const Values& values, const uint32_t* src,
+                       int32_t width, int32_t height, uint32_t* dst, const Selection* selection) {
+  Call call{};
+  if (std::string err = frame(effect, values, src, width, height, dst, selection, call);
+      !err.empty()) {
+    return err;
+  }
+  start_from_source(effect, call);
   {
     std::unique_lock<std::mutex> lock;
     if (effect.state != State::kNone) lock = std::unique_lock(state_lock(effect.state));
     if (std::string err = effect.run(call); !err.empty()) return err;
   }
-  if (selection != nullptr && effect.selects == Selects::kKeep) {
-    const uint8_t* m = selection->mask.data();
-    for (size_t i = 0; i < n; ++i) {
-      if (m[i] == 0) dst[i] = src[i];
-    }
-  }
+  keep_unselected(effect, selection, call);
   return {};
+}
+
+// ---- Sessions -------------------------------------------------------------------------------
+
+std::string Session::begin(const Effect& effect, const Values& values, const uint32_t* src,
+                           int32_t width, int32_t height, const Selection* selection) {
+  end();
+  if (effect.stages == nullptr) return std::string(effect.name) + " has no preview stages";
+  selected_ = selection != nullptr;
+  if (selected_) selection_ = *selection;
+  if (std::string err = frame(effect, values, src, width, height, nullptr,
+                              selected_ ? &selection_ : nullptr, call_);
+      !err.empty()) {
+    return err;
+  }
+  if (effect.state != State::kNone) lock_ = std::unique_lock(state_lock(effect.state));
+  if (std::string err = effect.stages->begin(call_); !err.empty()) {
+    effect.stages->end();
+    lock_ = {};
+    return err;
+  }
+  effect_ = &effect;
+  return {};
+}
+
+std::string Session::preview(const Values& values, uint32_t* dst) {
+  if (effect_ == nullptr) return "no preview session has begun";
+  // The workspace composites from the picture at every position: it must stay as it is.
+  if (dst == call_.src) return std::string(effect_->name) + ": a preview needs its own buffer";
+  call_.values = values;
+  call_.dst = dst;
+  start_from_source(*effect_, call_);
+  if (std::string err = effect_->stages->preview(call_); !err.empty()) return err;
+  keep_unselected(*effect_, selected_ ? &selection_ : nullptr, call_);
+  return {};
+}
+
+void Session::end() {
+  if (effect_ == nullptr) return;
+  effect_->stages->end();
+  effect_ = nullptr;
+  lock_ = {};
+  selection_ = {};
 }
 
 }  // namespace fxcat

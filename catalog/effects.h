@@ -13,6 +13,7 @@
 #include <cstdint>
 #include <cstdint>
 #include <memory>
+#include <mutex>
 #include <new>
 #include <span>
 #include <string>
@@ -133,6 +134,16 @@ using Run = std::string (*)(const Call&);
 using Size = std::string (*)(const Values&, int32_t width, int32_t height, int32_t& out_width,
                              int32_t& out_height);
 
+// The stages of an effect whose library calls keep a workspace between previews (the blur and
+// tilt-shift previews): begin builds it from the picture and selection, preview draws one set of
+// values from the same picture into dst, end releases it. The entry's run is the three in a row;
+// an editor's slider runs begin once per drag and preview per move (Session, below).
+struct Stages {
+  Run begin;
+  Run preview;
+  void (*end)();
+};
+
 struct Effect {
   const char* name;
   const char* family;
@@ -145,7 +156,8 @@ struct Effect {
   Writes writes = Writes::kAll;
   std::array<Param, kMaxParams> params;
   Run run;
-  Size size = nullptr;  // null: the output has the input's size
+  const Stages* stages = nullptr;  // null: run is one call with nothing kept
+  Size size = nullptr;             // null: the output has the input's size
   // Settings a gallery shows, one picture each, separated by ';'. Each is a comma-separated
   // list of NAME=VALUE overriding the defaults; an empty item is the defaults. Null: not shown.
   const char* gallery;
@@ -225,6 +237,38 @@ bool needs_two_buffers(const Effect& effect, bool selected);
 // Effects that use module-wide state are serialised by a lock per state.
 std::string run_effect(const Effect& effect, const Values& values, const uint32_t* src,
                        int32_t width, int32_t height, uint32_t* dst, const Selection* selection);
+
+// A slider drag over an effect with stages: begin builds the library's workspace once, each
+// preview runs only the preview stage and gives the pixels run_effect gives for its values, and
+// end (or the destructor) releases the workspace. The picture and selection handed to begin must
+// stay as they are until the end.
+//
+// The workspace is module-wide state, so the session holds the lock of the effect's state from
+// begin to end: other threads that run an effect with that state wait for the end, and the
+// thread holding the session must end it before it runs such an effect itself (it would wait for
+// itself).
+class Session {
+ public:
+  Session() = default;
+  ~Session() { end(); }
+  Session(const Session&) = delete;
+  Session& operator=(const Session&) = delete;
+
+  // Ends any session in progress and begins one with `effect`, which must have stages.
+  std::string begin(const Effect& effect, const Values& values, const uint32_t* src, int32_t width,
+                    int32_t height, const Selection* selection);
+  // One slider position into `dst`, width x height pixels apart from the picture.
+  std::string preview(const Values& values, uint32_t* dst);
+  void end();
+  const Effect* effect() const { return effect_; }
+
+ private:
+  const Effect* effect_ = nullptr;
+  Selection selection_;
+  bool selected_ = false;
+  Call call_{};
+  std::unique_lock<std::mutex> lock_;
+};
 
 // ---- Parameter constructors for the table ---------------------------------------------------
 

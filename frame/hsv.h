@@ -22,16 +22,29 @@ struct Hsv {
 // that call them vectorise (the table reads become gathers) and spares them the mispredicted
 // branches that the channel order and the hue sector of a photograph's pixels would cause.
 
+// LUT_DELTA[i] by single-precision division, for i in 0..255. Where the quotient 65536 / i is
+// not whole it lies at least 1 / i from the next whole number, and its rounding error is below
+// 1 / (256 i), so truncation gives the table's entry. For loops that vectorise only without
+// table reads: WebAssembly's SIMD has no gathers.
+inline int32_t divided_reciprocal(int32_t i) {
+  return i == 0 ? 0 : static_cast<int32_t>(65536.0f / static_cast<float>(i));
+}
+
+// Where rgb_to_hsv takes its reciprocals from: the same numbers either way.
+enum class Reciprocals { kTables, kDivision };
+
 // r, g and b must be in 0..255: they index the reciprocal tables.
+template <Reciprocals kFrom = Reciprocals::kTables>
 inline Hsv rgb_to_hsv(int32_t r, int32_t g, int32_t b) {
   const int32_t rg_max = r > g ? r : g, rg_min = r < g ? r : g;
   const int32_t mx = rg_max > b ? rg_max : b, mn = rg_min < b ? rg_min : b;
   const int32_t d = mx - mn;
+  const bool divide = kFrom == Reciprocals::kDivision;
   // LUT_DELTA[0] is 0, so a black pixel gets s = 0 without a test.
-  const int32_t s = static_cast<int32_t>(LUT_DELTA[mx]) * d;
+  const int32_t s = (divide ? divided_reciprocal(mx) : static_cast<int32_t>(LUT_DELTA[mx])) * d;
   // Signed: the channel differences may be negative. For a grey (d = 0) LUT_DELTA2[0] is 0 and
   // red is the largest channel, so the hue comes out 0 as it should.
-  const int32_t per = static_cast<int32_t>(LUT_DELTA2[d]);
+  const int32_t per = divide ? 60 * divided_reciprocal(d) : static_cast<int32_t>(LUT_DELTA2[d]);
   // Ties go to red first, then green.
   int32_t hf = r == mx   ? per * (g - b)
                : g == mx ? itofix(120) + per * (b - r)

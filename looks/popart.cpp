@@ -74,9 +74,17 @@ class Posterise {
 
 constexpr int32_t kPreviewHue[4] = {45, 300, 180, 90};
 
+// In WebAssembly the preview's loop vectorises only with its reciprocals divided out (there are
+// no gathers there), which makes it almost twice as fast; elsewhere the tables are the faster.
+#if defined(__wasm_simd128__)
+constexpr Reciprocals kPreviewReciprocals = Reciprocals::kDivision;
+#else
+constexpr Reciprocals kPreviewReciprocals = Reciprocals::kTables;
+#endif
+
 // Value kept, saturation raised by 10000 (held below full), hue fixed per quadrant.
 constexpr auto preview_recolour = [](Quadrant q, uint32_t s) {
-  const Hsv hsv = rgb_to_hsv(red_of(s), green_of(s), blue_of(s));
+  const Hsv hsv = rgb_to_hsv<kPreviewReciprocals>(red_of(s), green_of(s), blue_of(s));
   const int32_t sat = hsv.s + 10000 > 65535 ? 65535 : hsv.s + 10000;
   return pack(s, hsv_to_rgb(kPreviewHue[q], sat, hsv.v));
 };

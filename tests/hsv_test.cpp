@@ -1,8 +1,9 @@
-// HSV conversion: the reciprocal tables follow their rule.
+// HSV conversion: the reciprocal tables follow their rule, and division gives the same numbers.
 #include <gtest/gtest.h>
 
 #include <cstdint>
 
+#include "frame/hsv.h"
 #include "photofx.h"
 
 namespace {
@@ -15,6 +16,7 @@ TEST(HsvTables, AreTheTruncatedReciprocals) {
     EXPECT_EQ(LUT_DELTA[i], expected) << i;
     EXPECT_EQ(LUT_DELTA2[i], 60 * expected) << i;
   }
+  for (int32_t i = 0; i < 256; ++i) EXPECT_EQ(pfx::divided_reciprocal(i), LUT_DELTA[i]) << i;
 }
 
 }  // namespace

@@ -5,6 +5,7 @@
 #include <jpeglib.h>
 
 #include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <filesystem>
 #include <functional>
@@ -726,6 +727,49 @@ TEST(Catalog, EffectsThatRunInPlaceGiveWhatTwoBuffersGive) {
       }
       if (items.find(';') == std::string_view::npos) break;
       items.remove_prefix(items.find(';') + 1);
+    }
+  }
+}
+
+// An editor's slider drag builds an effect's workspace once and previews every move from it
+// (on a picture reduced 4 times, so the workspace is a scaled copy): each preview, at levels up
+// and down the range, whole and under a selection, is what a run of the effect alone gives, and
+// a preview into the picture it works from is refused.
+TEST(Catalog, SessionPreviewsGiveWhatEachRunGives) {
+  constexpr int32_t w = 900, h = 40;
+  const Image src = photo(w, h, 5);
+  fxcat::Selection sel;
+  fxcat::SelectionRequest ellipse;
+  ellipse.has_ellipse = true;
+  ellipse.ellipse = {400, 20, 300, 15};
+  ASSERT_EQ(fxcat::make_selection(ellipse, w, h, sel), "");
+  const fxcat::Selection* const choices[] = {nullptr, &sel};
+  for (const fxcat::Effect& e : fxcat::effects()) {
+    if (e.stages == nullptr) continue;
+    fxcat::Values values;
+    ASSERT_EQ(fxcat::resolve(e, {}, w, h, values), "");
+    const fxcat::Range r = fxcat::range_for(e.params[0], w, h);
+    const auto at = [&](int32_t step) { return r.min + std::floor((r.max - r.min) * step / 3); };
+    for (const fxcat::Selection* s : choices) {
+      std::vector<Image> alone;
+      for (int32_t step : {3, 0, 2, 1, 3}) {
+        values[0] = at(step);
+        alone.push_back(src);
+        ASSERT_EQ(
+            fxcat::run_effect(e, values, src.pixels.data(), w, h, alone.back().pixels.data(), s),
+            "");
+      }
+      fxcat::Session session;  // (holds the workspace's lock: no run_effect of it until the end)
+      ASSERT_EQ(session.begin(e, values, src.pixels.data(), w, h, s), "") << e.name;
+      size_t i = 0;
+      for (int32_t step : {3, 0, 2, 1, 3}) {
+        values[0] = at(step);
+        Image moved = src;
+        ASSERT_EQ(session.preview(values, moved.pixels.data()), "");
+        EXPECT_EQ(moved.pixels, alone[i++].pixels)
+            << e.name << " at " << values[0] << (s ? " in" : "");
+      }
+      EXPECT_NE(session.preview(values, const_cast<uint32_t*>(src.pixels.data())), "");
     }
   }
 }

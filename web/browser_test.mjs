@@ -117,6 +117,27 @@ try {
   check(`after ${s.at(-1)}`, await canvasHash(), nativeHash(s));
   await page.click('#clear');
 
+  // A slider dragged over the blur inside a rectangle: the previews of one drag share a
+  // workspace, and a middle frame and the last must be the preview step's own pixels.
+  await page.click('input[name=tool][value=rect]');
+  await page.mouse.move(v.x + v.width * 0.25, v.y + v.height * 0.2);
+  await page.mouse.down();
+  await page.mouse.move(v.x + v.width * 0.6, v.y + v.height * 0.7, { steps: 4 });
+  await page.mouse.up();
+  await page.click('button[data-effect=blur]');
+  await idle();
+  const level = await page.$eval('#params input[name=level]', (e) => e.getBoundingClientRect().toJSON());
+  await page.mouse.move(level.x + level.width * 0.5, level.y + level.height / 2);
+  await page.mouse.down();
+  for (const at of [0.3, 0.95]) {
+    await page.mouse.move(level.x + level.width * at, level.y + level.height / 2, { steps: 4 });
+    await idle();
+    const step = await page.evaluate(() => photofxEditor.preview());
+    check(`${step} while dragging`, await canvasHash(), nativeHash([...(await steps()), step]));
+  }
+  await page.mouse.up();
+  await page.click('#clear');
+
   // A slider dragged on the whole picture: the warp's fast preview while the button is down,
   // the full warp on release; then undone.
   await page.click('input[name=tool][value=none]');

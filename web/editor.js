@@ -165,18 +165,22 @@ function schedulePreview() {
   pumpPreview();
 }
 
+// The step a slider's move runs on the working copy: the catalogue's preview ("blur-preview",
+// "twirl --fast on", or "" for the effect itself) with the values as they stand.
+function previewText() {
+  const [name, ...set] = ed.effect.preview ? ed.effect.preview.split(' ') : [ed.effect.name];
+  const values = { ...ed.values };
+  for (let i = 0; i + 1 < set.length; i += 2) values[set[i].replace(/^--/, '')] = set[i + 1];
+  return stepText(findEffect(name), values, ed.previewScale);
+}
+
 async function pumpPreview() {
   if (ed.previewing || !ed.previewPending || !ed.effect) return;
   ed.previewPending = false;
   ed.previewing = true;
   const effect = ed.effect;
-  // The catalogue's preview: "blur-preview", "twirl --fast on", or "" for the effect itself.
-  const [name, ...set] = effect.preview ? effect.preview.split(' ') : [effect.name];
-  const runs = findEffect(name);
-  const values = { ...ed.values };
-  for (let i = 0; i + 1 < set.length; i += 2) values[set[i].replace(/^--/, '')] = set[i + 1];
   try {
-    draw(await ask('render', { preview: stepText(runs, values, ed.previewScale), mask: brushMask(effect) }));
+    draw(await ask('render', { preview: previewText(), mask: brushMask(effect) }));
   } catch (err) {
     say(err.message);
   }
@@ -641,6 +645,7 @@ window.photofxEditor = {
   idle: () => waiting.size === 0 && !ed.previewPending && !ed.previewing,
   chain: chainText,
   steps: () => ed.steps.slice(0, ed.pos).map((s) => s.text),
+  preview: () => ed.effect && previewText(),
   maskPng: async (i) => {
     const b = await maskBlob(ed.steps[i].mask);
     let text = '';

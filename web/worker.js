@@ -8,8 +8,11 @@ importScripts('photofx.js');
 
 let fx = null; // the wasm module
 let ready = null; // resolves when fx is there
+// The slider drag the module holds (see previewOn), or null.
+let drag = null;
 
 function start() {
+  drag = null;
   ready = createPhotofx().then((m) => {
     fx = m;
   });
@@ -47,26 +50,72 @@ function toHeap(bytes) {
   return p;
 }
 
+function textToHeap(text) {
+  return toHeap(new TextEncoder().encode(text + '\0'));
+}
+
+// The module's answer to a run: the result's pixels, or its reason for refusing.
+function takeOut(ok) {
+  if (!ok) throw new Error(fx.UTF8ToString(fx._pfxw_error()));
+  const w = fx._pfxw_out_width();
+  const h = fx._pfxw_out_height();
+  const out = fx._pfxw_out_pixels();
+  const pixels = fx.HEAPU8.slice(out, out + w * h * 4).buffer;
+  fx._pfxw_release();
+  return { pixels, width: w, height: h };
+}
+
 // Runs `text` (steps in the chain syntax) on pixels; `mask` null or one byte per pixel.
 function run(text, pixels, width, height, mask) {
   const src = toHeap(new Uint8Array(pixels));
   const m = mask ? toHeap(mask) : 0;
-  const t = toHeap(new TextEncoder().encode(text + '\0'));
+  const t = textToHeap(text);
   try {
-    if (!fx._pfxw_run(t, src, width, height, m)) {
-      throw new Error(fx.UTF8ToString(fx._pfxw_error()));
-    }
-    const w = fx._pfxw_out_width();
-    const h = fx._pfxw_out_height();
-    const out = fx._pfxw_out_pixels();
-    const result = fx.HEAPU8.slice(out, out + w * h * 4).buffer;
-    fx._pfxw_release();
-    return { pixels: result, width: w, height: h };
+    return takeOut(fx._pfxw_run(t, src, width, height, m));
   } finally {
     fx._free(t);
     if (m) fx._free(m);
     fx._free(src);
   }
+}
+
+function sameBytes(a, b) {
+  if (!a || !b) return a === b;
+  if (a.length !== b.length) return false;
+  for (let i = 0; i < a.length; ++i) if (a[i] !== b[i]) return false;
+  return true;
+}
+
+// A preview while a slider moves. The first one of a drag hands the module the working copy
+// (and the brush's selection); the module keeps them, and the workspace of the blur and
+// tilt-shift previews, until the drag ends: when anything but a preview is asked of the worker
+// (the slider let go, another effect or picture), or the picture or selection changes.
+function previewOn(text, w, mask) {
+  if (!drag || drag.work !== w || !sameBytes(drag.mask, mask)) {
+    endDrag();
+    const src = toHeap(new Uint8Array(w.pixels));
+    const m = mask ? toHeap(mask) : 0;
+    try {
+      if (!fx._pfxw_drag_begin(src, w.width, w.height, m)) {
+        throw new Error(fx.UTF8ToString(fx._pfxw_error()));
+      }
+    } finally {
+      if (m) fx._free(m);
+      fx._free(src);
+    }
+    drag = { work: w, mask };
+  }
+  const t = textToHeap(text);
+  try {
+    return takeOut(fx._pfxw_drag_preview(t));
+  } finally {
+    fx._free(t);
+  }
+}
+
+function endDrag() {
+  if (drag) fx._pfxw_drag_end();
+  drag = null;
 }
 
 function catalogue(width, height) {
@@ -165,9 +214,7 @@ const ops = {
     if (preview !== undefined) {
       const w = workingCopy();
       const s = states[current];
-      const m = reduceMask(mask, s.width, w.width, w.height, w.scale);
-      const r = run(preview, w.pixels, w.width, w.height, m);
-      return r;
+      return previewOn(preview, w, reduceMask(mask, s.width, w.width, w.height, w.scale));
     }
     const s = states[current];
     return run(step, pixelsOf(current), s.width, s.height, mask);
@@ -205,6 +252,9 @@ onmessage = async (e) => {
   const { id, op } = e.data;
   try {
     await ready;
+    // One message at a time, and a drag's previews only between its begin and end: the
+    // module's workspace is module-wide.
+    if (op !== 'render' || e.data.preview === undefined) endDrag();
     const result = ops[op](e.data);
     const transfer = result && result.pixels ? [result.pixels] : [];
     postMessage({ id, ok: true, ...result }, transfer);
