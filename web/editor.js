@@ -88,7 +88,7 @@ function swapRedBlue(from, to) {
 
 // A result in the canvas's byte order (`canvas`) is drawn from its own bytes, uncopied.
 function toImageData(r) {
-  if (r.canvas) return new ImageData(new Uint8ClampedArray(r.pixels), r.width, r.height);
+  if (r.canvas) return new ImageData(new Uint8ClampedArray(r.pixels, 0, r.width * r.height * 4), r.width, r.height);
   const img = new ImageData(r.width, r.height);
   swapRedBlue(new Uint32Array(r.pixels), new Uint32Array(img.data.buffer));
   return img;
@@ -109,9 +109,13 @@ function draw(r) {
   if (r.width === view.width && r.height === view.height) {
     view.getContext('2d').putImageData(toImageData(r), 0, 0);
   } else {
-    const small = document.createElement('canvas');
-    small.width = r.width;
-    small.height = r.height;
+    // One canvas for results of another size, kept: making one per slider move costs more
+    // than the move's own work.
+    const small = (draw.small ||= document.createElement('canvas'));
+    if (small.width !== r.width || small.height !== r.height) {
+      small.width = r.width;
+      small.height = r.height;
+    }
     small.getContext('2d').putImageData(toImageData(r), 0, 0);
     view.getContext('2d').drawImage(small, 0, 0, view.width, view.height);
   }

@@ -69,7 +69,8 @@ function takeOut(ok, canvas = false) {
   const out = canvas ? fx._pfxw_out_canvas() : fx._pfxw_out_pixels();
   const bytes = fx.HEAPU8.subarray(out, out + w * h * 4);
   let pixels;
-  if (canvas && spare && spare.byteLength === bytes.length) {
+  // (A larger spare serves too: the page reads the first width x height x 4 bytes.)
+  if (canvas && spare && spare.byteLength >= bytes.length) {
     new Uint8Array(spare).set(bytes);
     pixels = spare;
     spare = null;
