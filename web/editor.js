@@ -24,10 +24,18 @@ worker.onmessage = (e) => {
   showBusy();
 };
 
+// A drawn result's buffer, going back to the worker with the next message for its next result.
+let spare = null;
+
 function ask(op, args = {}, transfer = []) {
   return new Promise((resolve, reject) => {
     const id = nextId++;
     waiting.set(id, { resolve, reject });
+    if (spare) {
+      args = { ...args, spare };
+      transfer = [...transfer, spare];
+      spare = null;
+    }
     worker.postMessage({ id, op, ...args }, transfer);
     showBusy();
   });
@@ -78,7 +86,9 @@ function swapRedBlue(from, to) {
   }
 }
 
+// A result in the canvas's byte order (`canvas`) is drawn from its own bytes, uncopied.
 function toImageData(r) {
+  if (r.canvas) return new ImageData(new Uint8ClampedArray(r.pixels, 0, r.width * r.height * 4), r.width, r.height);
   const img = new ImageData(r.width, r.height);
   swapRedBlue(new Uint32Array(r.pixels), new Uint32Array(img.data.buffer));
   return img;
@@ -98,13 +108,19 @@ function draw(r) {
   const view = $('view');
   if (r.width === view.width && r.height === view.height) {
     view.getContext('2d').putImageData(toImageData(r), 0, 0);
-    return;
+  } else {
+    // One canvas for results of another size, kept: making one per slider move costs more
+    // than the move's own work.
+    const small = (draw.small ||= document.createElement('canvas'));
+    if (small.width !== r.width || small.height !== r.height) {
+      small.width = r.width;
+      small.height = r.height;
+    }
+    small.getContext('2d').putImageData(toImageData(r), 0, 0);
+    view.getContext('2d').drawImage(small, 0, 0, view.width, view.height);
   }
-  const small = document.createElement('canvas');
-  small.width = r.width;
-  small.height = r.height;
-  small.getContext('2d').putImageData(toImageData(r), 0, 0);
-  view.getContext('2d').drawImage(small, 0, 0, view.width, view.height);
+  // The canvas holds its own copy now: a result made for drawing can take the next one.
+  if (r.canvas) spare = r.pixels;
 }
 
 function showCurrent() {

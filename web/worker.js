@@ -2,7 +2,9 @@
 // the history, and the runs of steps the page asks for.
 //
 // Messages in: {id, op, ...}; each is answered once with {id, ok, ...} (ok false: `error` says
-// why). Pixels travel as ArrayBuffers of 0xAARRGGBB words, transferred, never shared.
+// why). Pixels travel as ArrayBuffers of 0xAARRGGBB words, transferred, never shared; the results
+// of `render` come in the canvas's byte order instead (`canvas` true), ready to be drawn. A
+// message may bring back such a buffer the page has drawn (`spare`) for the next one to reuse.
 /* global importScripts, createPhotofx */
 importScripts('photofx.js');
 
@@ -54,24 +56,38 @@ function textToHeap(text) {
   return toHeap(new TextEncoder().encode(text + '\0'));
 }
 
-// The module's answer to a run: the result's pixels, or its reason for refusing.
-function takeOut(ok) {
+// A drawn result the page gave back: the next one of its size is copied into it rather than
+// into a new buffer (a fresh 3 MB buffer per slider move costs more than copying into it).
+let spare = null;
+
+// The module's answer to a run: the result's pixels, or its reason for refusing. `canvas`: in
+// the canvas's byte order, for drawing.
+function takeOut(ok, canvas = false) {
   if (!ok) throw new Error(fx.UTF8ToString(fx._pfxw_error()));
   const w = fx._pfxw_out_width();
   const h = fx._pfxw_out_height();
-  const out = fx._pfxw_out_pixels();
-  const pixels = fx.HEAPU8.slice(out, out + w * h * 4).buffer;
+  const out = canvas ? fx._pfxw_out_canvas() : fx._pfxw_out_pixels();
+  const bytes = fx.HEAPU8.subarray(out, out + w * h * 4);
+  let pixels;
+  // (A larger spare serves too: the page reads the first width x height x 4 bytes.)
+  if (canvas && spare && spare.byteLength >= bytes.length) {
+    new Uint8Array(spare).set(bytes);
+    pixels = spare;
+    spare = null;
+  } else {
+    pixels = bytes.slice().buffer;
+  }
   fx._pfxw_release();
-  return { pixels, width: w, height: h };
+  return { pixels, width: w, height: h, canvas };
 }
 
 // Runs `text` (steps in the chain syntax) on pixels; `mask` null or one byte per pixel.
-function run(text, pixels, width, height, mask) {
+function run(text, pixels, width, height, mask, canvas = false) {
   const src = toHeap(new Uint8Array(pixels));
   const m = mask ? toHeap(mask) : 0;
   const t = textToHeap(text);
   try {
-    return takeOut(fx._pfxw_run(t, src, width, height, m));
+    return takeOut(fx._pfxw_run(t, src, width, height, m), canvas);
   } finally {
     fx._free(t);
     if (m) fx._free(m);
@@ -107,7 +123,7 @@ function previewOn(text, w, mask) {
   }
   const t = textToHeap(text);
   try {
-    return takeOut(fx._pfxw_drag_preview(t));
+    return takeOut(fx._pfxw_drag_preview(t), true);
   } finally {
     fx._free(t);
   }
@@ -209,7 +225,8 @@ const ops = {
     return { catalogue: catalogue(width, height) };
   },
   // Runs a step on the current picture without keeping it: on the working copy for a
-  // preview (`preview` is the step for the working copy), on the picture itself otherwise.
+  // preview (`preview` is the step for the working copy), on the picture itself otherwise. The
+  // result is only drawn, so it comes in the canvas's byte order.
   render({ step, mask, preview }) {
     if (preview !== undefined) {
       const w = workingCopy();
@@ -217,7 +234,7 @@ const ops = {
       return previewOn(preview, w, reduceMask(mask, s.width, w.width, w.height, w.scale));
     }
     const s = states[current];
-    return run(step, pixelsOf(current), s.width, s.height, mask);
+    return run(step, pixelsOf(current), s.width, s.height, mask, true);
   },
   // Runs a step and makes its result the next state of the history (dropping any redo).
   commit({ step, mask }) {
@@ -250,6 +267,7 @@ const ops = {
 
 onmessage = async (e) => {
   const { id, op } = e.data;
+  if (e.data.spare) spare = e.data.spare;
   try {
     await ready;
     // One message at a time, and a drag's previews only between its begin and end: the
