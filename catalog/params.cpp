@@ -201,4 +201,42 @@ std::string format_value(const Param& p, double value) {
   return format_number(value);
 }
 
+const char* kind_name(Kind k) {
+  switch (k) {
+    case Kind::kInteger:
+      break;
+    case Kind::kReal:
+      return "real";
+    case Kind::kChoice:
+      return "choice";
+  }
+  return "integer";
+}
+
+const char* extent_name(Extent e) {
+  switch (e) {
+    case Extent::kWidth:
+      return "width";
+    case Extent::kHeight:
+      return "height";
+    case Extent::kLonger:
+      return "longer";
+    case Extent::kNone:
+      break;
+  }
+  return "none";
+}
+
+const char* selects_name(Selects s) {
+  switch (s) {
+    case Selects::kMask:
+      return "mask";
+    case Selects::kKeep:
+      return "keep";
+    case Selects::kNothing:
+      break;
+  }
+  return "nothing";
+}
+
 }  // namespace fxcat

@@ -40,6 +40,11 @@ std::string resolve(const Effect& effect, const Settings& settings, int32_t widt
 // "0..20 (10)", "0..W-1 (W/2)", "horizontal|vertical (horizontal)".
 std::string describe(const Param& p);
 
+// The enumerations' names as hosts hand them on (the page's catalogue, the Python package's).
+const char* kind_name(Kind k);
+const char* extent_name(Extent e);  // "none" for a setting that is not a position or size
+const char* selects_name(Selects s);
+
 // A value as the user would write it: a number, or a choice's label.
 std::string format_value(const Param& p, double value);
 

@@ -44,44 +44,6 @@ std::string number(double v) {
   return buf;
 }
 
-const char* kind_name(fxcat::Kind k) {
-  switch (k) {
-    case fxcat::Kind::kInteger:
-      return "integer";
-    case fxcat::Kind::kReal:
-      return "real";
-    case fxcat::Kind::kChoice:
-      return "choice";
-  }
-  return "integer";
-}
-
-const char* extent_name(fxcat::Extent e) {
-  switch (e) {
-    case fxcat::Extent::kNone:
-      return "none";
-    case fxcat::Extent::kWidth:
-      return "width";
-    case fxcat::Extent::kHeight:
-      return "height";
-    case fxcat::Extent::kLonger:
-      return "longer";
-  }
-  return "none";
-}
-
-const char* selects_name(fxcat::Selects s) {
-  switch (s) {
-    case fxcat::Selects::kMask:
-      return "mask";
-    case fxcat::Selects::kKeep:
-      return "keep";
-    case fxcat::Selects::kNothing:
-      return "nothing";
-  }
-  return "nothing";
-}
-
 // Every effect with its parameters' ranges and defaults resolved for a width x height image.
 std::string catalogue_json(int32_t width, int32_t height) {
   std::string j = "{\"maxPixels\":" + number(double(fxcat::kMaxPixels)) + ",\"effects\":[";
@@ -90,15 +52,16 @@ std::string catalogue_json(int32_t width, int32_t height) {
     j += first ? "" : ",";
     first = false;
     j += "{\"name\":" + quoted(e.name) + ",\"family\":" + quoted(e.family) +
-         ",\"summary\":" + quoted(e.summary) + ",\"selects\":" + quoted(selects_name(e.selects)) +
+         ",\"summary\":" + quoted(e.summary) +
+         ",\"selects\":" + quoted(fxcat::selects_name(e.selects)) +
          ",\"preview\":" + quoted(fxcat::preview_step(e)) + ",\"params\":[";
     for (size_t k = 0; k < e.param_count(); ++k) {
       const Param& p = e.params[k];
       const fxcat::Range r = fxcat::range_for(p, width, height);
       j += k == 0 ? "" : ",";
       j += "{\"name\":" + quoted(p.name) + ",\"help\":" + quoted(p.help) +
-           ",\"kind\":" + quoted(kind_name(p.kind)) +
-           ",\"extent\":" + quoted(extent_name(p.extent)) +
+           ",\"kind\":" + quoted(fxcat::kind_name(p.kind)) +
+           ",\"extent\":" + quoted(fxcat::extent_name(p.extent)) +
            ",\"describe\":" + quoted(fxcat::describe(p));
       if (p.kind == fxcat::Kind::kChoice) {
         j += ",\"choices\":[";

@@ -639,32 +639,6 @@ py::array run_chain(const std::vector<std::string>& words, py::handle img, const
 
 // ---- The catalogue, for Python --------------------------------------------------------------
 
-const char* selects_name(Selects s) {
-  switch (s) {
-    case Selects::kMask:
-      return "mask";
-    case Selects::kKeep:
-      return "keep";
-    case Selects::kNothing:
-      break;
-  }
-  return "nothing";
-}
-
-const char* extent_name(fxcat::Extent e) {
-  switch (e) {
-    case fxcat::Extent::kWidth:
-      return "width";
-    case fxcat::Extent::kHeight:
-      return "height";
-    case fxcat::Extent::kLonger:
-      return "longer";
-    case fxcat::Extent::kNone:
-      break;
-  }
-  return "";
-}
-
 py::list catalog() {
   py::list entries;
   for (const Effect& e : fxcat::effects()) {
@@ -675,7 +649,8 @@ py::list catalog() {
       d["name"] = p.name;
       d["help"] = p.help;
       d["describe"] = fxcat::describe(p);
-      d["extent"] = extent_name(p.extent);
+      // Python has always said "" where a setting is no position or size.
+      d["extent"] = p.extent == fxcat::Extent::kNone ? "" : fxcat::extent_name(p.extent);
       if (p.kind == Kind::kChoice) {
         py::list labels;
         for (int32_t i = 0; i < p.choice_count; ++i) labels.append(p.choices[i].label);
@@ -703,7 +678,7 @@ py::list catalog() {
     d["name"] = e.name;
     d["family"] = e.family;
     d["summary"] = e.summary;
-    d["selects"] = selects_name(e.selects);
+    d["selects"] = fxcat::selects_name(e.selects);
     d["state"] = e.state != State::kNone;
     d["in_place"] = e.in_place && e.size == nullptr;
     d["params"] = params;
