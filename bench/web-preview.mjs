@@ -3,20 +3,10 @@
 // the preview on the canvas is measured (the median of 7 moves). Effects without a slider are
 // timed from the click that renders them. Prints "name<TAB>ms" lines.
 //
-//   node web-preview.mjs URL   (the page served from build/wasm/web)
-import { mkdtempSync, rmSync } from 'node:fs';
-import { tmpdir } from 'node:os';
-import { join } from 'node:path';
-import puppeteer from 'puppeteer-core';
+//   node web-preview.mjs URL   (the page served from build/wasm/web; beside web/chromium.mjs)
+import { launchChromium } from './chromium.mjs';
 
-const profile = mkdtempSync(join(tmpdir(), 'photofx-chromium-'));
-const browser = await puppeteer.launch({
-  executablePath: '/usr/bin/chromium',
-  headless: true,
-  userDataDir: profile,
-  args: ['--no-sandbox', '--disable-gpu', '--disable-background-networking', '--disable-component-update',
-    '--disable-sync', '--no-first-run'],
-});
+const browser = await launchChromium();
 const page = await browser.newPage();
 page.setDefaultTimeout(120000);
 await page.setViewport({ width: 1600, height: 1000 });
@@ -68,5 +58,4 @@ for (const name of names) {
   }, name);
   console.log(`${name}\t${ms.toFixed(1)}`);
 }
-await browser.close();
-rmSync(profile, { recursive: true, force: true });
+await browser.closeAndClean();

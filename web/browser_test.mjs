@@ -9,7 +9,7 @@ import { mkdtempSync, readFileSync, rmSync, writeFileSync } from 'node:fs';
 import { createServer } from 'node:http';
 import { tmpdir } from 'node:os';
 import { extname, join, resolve } from 'node:path';
-import puppeteer from 'puppeteer-core';
+import { launchChromium } from './chromium.mjs';
 
 const [webDir, tool] = process.argv.slice(2).map((p) => resolve(p));
 const work = mkdtempSync(join(tmpdir(), 'photofx-browser-'));
@@ -53,14 +53,7 @@ const server = createServer((req, res) => {
 });
 await new Promise((resolve) => server.listen(0, '127.0.0.1', resolve));
 
-const profile = mkdtempSync(join(tmpdir(), 'photofx-chromium-'));
-const browser = await puppeteer.launch({
-  executablePath: '/usr/bin/chromium',
-  headless: true,
-  userDataDir: profile,
-  args: ['--no-sandbox', '--disable-gpu', '--disable-background-networking', '--disable-component-update',
-    '--disable-sync', '--no-first-run'],
-});
+const browser = await launchChromium();
 try {
   const page = await browser.newPage();
   page.setDefaultTimeout(60000);
@@ -169,9 +162,9 @@ try {
   await page.waitForSelector('#message:not([hidden])');
   check('a file that is not a picture', await page.$eval('#message', (e) => e.textContent.startsWith('notes.txt is not a picture')) && (await canvasHash()), kept);
 } finally {
-  await browser.close();
+  await browser.closeAndClean();
   server.close();
-  for (const dir of [work, profile]) rmSync(dir, { recursive: true, force: true });
+  rmSync(work, { recursive: true, force: true });
 }
 console.log(`${passes} passed, ${failures} failed`);
 process.exit(failures === 0 && passes > 0 ? 0 : 1);
